@@ -53,7 +53,8 @@ public:
     void setParent(Directory* directory) { parent_ = directory; }
 
 protected:
-    DirEnt() = default;
+    // Out of line so that the workspace can count live entries.
+    DirEnt();
 
     std::int32_t refCount_ = 0;
     Directory* parent_ = nullptr;
