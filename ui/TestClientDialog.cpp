@@ -8,6 +8,8 @@
 #include <new>
 #include <system_error>
 
+#include "app/CommandLine.h"
+#include "app/Settings.h"
 #include "errors/ErrorText.h"
 #include "session/BrickSession.h"
 #include "tessel/ReaderWriter.h"
@@ -133,8 +135,25 @@ const DialogTemplate& TestClientDialogTemplate()
 TestClientDialog::TestClientDialog(WindowHost& host, const char* commandLine) : host_(host)
 {
     postTarget_.host = &host_;
-    // TODO: the settings reader lands with app/Settings.h.
-    (void)commandLine;
+
+    const app::CommandLineParts parts = app::SplitCommandLine(commandLine ? commandLine : "");
+    SetCurrentFile(parts.currentFile.c_str());
+
+    const app::DialogSettings settings = app::ReadDialogSettings(parts.settingsPath.c_str());
+    CopyText(firmwareFile_, sizeof firmwareFile_, settings.firmwareFile);
+    CopyText(firmwareDir_, sizeof firmwareDir_, settings.firmwareDir);
+    CopyText(serialPort_, sizeof serialPort_, settings.serialPort);
+    CopyText(usbPort_, sizeof usbPort_, settings.usbPort);
+    autoRun_ = settings.autoRun;
+    autoClear_ = settings.autoClear;
+    autoDownload_ = settings.autoDownload;
+    CopyText(logFile_, sizeof logFile_, settings.logFile);
+
+    session_ = new (std::nothrow) BrickSession(parts.settingsPath.c_str());
+
+    traceOptions_ = app::ReadTraceOptions(parts.settingsPath.c_str());
+    if (session_ != nullptr)
+        app::ApplyTraceOptions(*session_, traceOptions_);
 }
 
 TestClientDialog::~TestClientDialog()
@@ -271,6 +290,7 @@ bool TestClientDialog::RouteCommand(int id)
     }
     return true;
 }
+
 void TestClientDialog::OnCustomMessage(Message message, WParam wParam, LParam lParam)
 {
     // wParam carries a packed code: its low 32 bits are the signed value.
