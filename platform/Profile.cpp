@@ -60,6 +60,8 @@ std::uint32_t CopyCut(std::string_view text, char* buffer, std::uint32_t size)
     if (buffer == nullptr || size == 0) {
         return 0;
     }
+    // A zero byte (a binary file) ends the text, as it would for any reader of the result.
+    text = text.substr(0, text.find('\0'));
     const std::size_t count = text.size() < size - 1 ? text.size() : size - 1;
     std::memcpy(buffer, text.data(), count);
     buffer[count] = '\0';
@@ -144,7 +146,9 @@ std::uint32_t ReadSectionNames(ProfileScanner& scanner, char* buffer, std::uint3
     std::string_view value;
     for (auto kind = scanner.next(name, value); kind != ProfileScanner::Kind::End;
          kind = scanner.next(name, value)) {
-        if (kind != ProfileScanner::Kind::Section) {
+        // An empty name would end the list early.
+        name = name.substr(0, name.find('\0'));
+        if (kind != ProfileScanner::Kind::Section || name.empty()) {
             continue;
         }
         bool known = false;
@@ -226,6 +230,11 @@ std::uint32_t ReadProfileString(const char* section, const char* key, const char
                 if (EqualNoCase(name, key)) {
                     return CopyCut(value, buffer, size);
                 }
+                continue;
+            }
+            // An empty name would end the list early.
+            name = name.substr(0, name.find('\0'));
+            if (name.empty()) {
                 continue;
             }
             bool known = false;
