@@ -2,54 +2,294 @@
 // the reports that the library's callbacks post.
 #include "ui/TestClientDialog.h"
 
+#include <cstdint>
+#include <cstdio>
+
+#include "errors/ErrorSink.h"
+#include "errors/ErrorText.h"
 #include "session/BrickSession.h"
 
 namespace ui {
 
+namespace {
+
+const tessel::Long kNoLibrary = static_cast<tessel::Long>(tessel::kLinkFailed);
+
+constexpr const char* kClearCommand = "clear tasks clear subs";
+constexpr const char* kStartCommand = "start main";
+
+} // namespace
+
 void TestClientDialog::OnValidate()
 {
-    // TODO: not written yet; shows nothing.
+    if (host_.ListSelection(handle(), IdSourceList) == SourceListOpal) {
+        ShowFailure("Cannot validate Opal source (yet?)");
+        return;
+    }
+    ClearStatus();
+    const std::unique_ptr<char[]> text = ReadEditorText();
+    if (!text || text[0] == '\0')
+        return;
+
+    // Whatever the Source list shows, validation checks the text as a script.
+    ErrorSink sink;
+    const tessel::Long code =
+        session_ != nullptr ? session_->TranslateText(SelectedBrickType(), tessel::FileScript,
+                                                      text.get(), nullptr, &sink, nullptr, nullptr)
+                            : kNoLibrary;
+    if (code >= 0) {
+        ShowStatus("OK");
+    } else {
+        PlaceEditorCaret(sink.GetPosition());
+        ShowError(code, &sink);
+    }
+    FocusEditor();
 }
 
 void TestClientDialog::OnExecute()
 {
-    // TODO: not written yet; shows nothing.
+    if (brickHandle_ == 0 || session_ == nullptr) {
+        ShowFailure("Port not open");
+        return;
+    }
+    ClearStatus();
+    const tessel::Short brickType = SelectedBrickType();
+    const std::unique_ptr<char[]> text = ReadEditorText();
+    if (!text || text[0] == '\0')
+        return;
+    const std::int32_t sourceType = SelectedSourceType();
+
+    ErrorSink sink;
+    ReaderWriter* object = nullptr;
+    tessel::Long code = session_->TranslateText(brickType, sourceType, text.get(), &object, &sink,
+                                                nullptr, nullptr);
+    if (code < 0) {
+        BrickSession::ReleaseReaderWriter(&object);
+        PlaceEditorCaret(sink.GetPosition());
+        ShowError(code, &sink);
+        OfferTroubleShooter(code);
+        FocusEditor();
+        return;
+    }
+    if (BrickSession::ContentSize(object) == 0) {
+        BrickSession::ReleaseReaderWriter(&object);
+        ShowFailure("No code");
+        return;
+    }
+
+    tessel::Long result = 0;
+    ReaderWriter* resultFile = nullptr;
+    code = session_->ExecCode(brickHandle_, object, &result, &resultFile, nullptr, nullptr);
+    BrickSession::ReleaseReaderWriter(&object);
+
+    // Both files go back before the offer: a Trouble Shooter run pumps messages, and the
+    // window (with the session) may be gone by the time it returns.
+    if (code >= 0) {
+        const std::unique_ptr<char[]> output = ReadFileText(resultFile);
+        BrickSession::ReleaseReaderWriter(&resultFile);
+        if (output)
+            ShowStatusF("Exec result: %d (%s)", static_cast<int>(result), output.get());
+        else
+            ShowStatus("Exec ok");
+    } else {
+        BrickSession::ReleaseReaderWriter(&resultFile);
+        ShowError(code, nullptr);
+        OfferTroubleShooter(code);
+    }
+    FocusEditor();
 }
 
 void TestClientDialog::OnExecuteAsync()
 {
-    // TODO: not written yet; shows nothing.
+    if (brickHandle_ == 0 || session_ == nullptr) {
+        ShowFailure("Port not open");
+        return;
+    }
+    ClearStatus();
+    const tessel::Short brickType = SelectedBrickType();
+    const std::unique_ptr<char[]> text = ReadEditorText();
+    if (!text || text[0] == '\0')
+        return;
+    const std::int32_t sourceType = SelectedSourceType();
+
+    ErrorSink sink;
+    ReaderWriter* object = nullptr;
+    tessel::Long code = session_->TranslateText(brickType, sourceType, text.get(), &object, &sink,
+                                                nullptr, nullptr);
+    if (code < 0) {
+        BrickSession::ReleaseReaderWriter(&object);
+        PlaceEditorCaret(sink.GetPosition());
+        ShowError(code, &sink);
+        FocusEditor();
+        return;
+    }
+    if (BrickSession::ContentSize(object) == 0) {
+        BrickSession::ReleaseReaderWriter(&object);
+        ShowFailure("No code");
+        return;
+    }
+
+    // The result arrives as WM_USER+3. A call refused outright never reports back, so its
+    // refusal is shown here; otherwise the user would be left with an empty status box.
+    code = StartAsyncExec(object);
+    BrickSession::ReleaseReaderWriter(&object);
+    if (code < 0)
+        ShowError(code, nullptr);
+    FocusEditor();
 }
 
 void TestClientDialog::OnDownload()
 {
-    // TODO: not written yet; shows nothing.
+    if (brickHandle_ == 0 || session_ == nullptr) {
+        ShowFailure("Port not open");
+        return;
+    }
+    ClearStatus();
+    const std::unique_ptr<char[]> text = ReadEditorText();
+    if (!text || text[0] == '\0')
+        return;
+    const std::int32_t sourceType = SelectedSourceType();
+    const tessel::Short brickType = SelectedBrickType();
+
+    // A download the user starts ends a stress test that stalled: its completion must not
+    // start the next stress iteration.
+    stressIteration_ = 0;
+
+    if (host_.IsChecked(handle(), IdAutoClear)) {
+        const tessel::Long cleared = RunCommand(kClearCommand, brickType);
+        if (cleared < 0) {
+            ShowError(cleared, nullptr);
+            OfferTroubleShooter(cleared);
+            return;
+        }
+    }
+
+    ErrorSink sink;
+    ReaderWriter* object = nullptr;
+    const tessel::Long code = session_->TranslateText(brickType, sourceType, text.get(), &object,
+                                                      &sink, nullptr, nullptr);
+    if (code >= 0) {
+        DownloadObject(object);
+        BrickSession::ReleaseReaderWriter(&object);
+    } else {
+        BrickSession::ReleaseReaderWriter(&object);
+        PlaceEditorCaret(sink.GetPosition());
+        ShowError(code, &sink);
+        OfferTroubleShooter(code);
+    }
+    FocusEditor();
 }
 
 void TestClientDialog::OnDownloadFile()
 {
-    // TODO: not written yet; shows nothing.
+    if (brickHandle_ == 0 || session_ == nullptr) {
+        ShowFailure("Port not open");
+        return;
+    }
+    char fileName[kPathSize] = {};
+    host_.GetControlText(handle(), IdDownloadFileName, fileName, sizeof fileName);
+    const tessel::Short brickType = SelectedBrickType();
+
+    stressIteration_ = 0;
+
+    if (host_.IsChecked(handle(), IdAutoClear)) {
+        const tessel::Long cleared = RunCommand(kClearCommand, brickType);
+        if (cleared < 0) {
+            ShowError(cleared, nullptr);
+            OfferTroubleShooter(cleared);
+            return;
+        }
+    }
+
+    // A file is either a script or assembler source; no selection counts as Script.
+    const int selected = host_.ListSelection(handle(), IdSourceList);
+    const std::int32_t sourceType =
+        selected == SourceListScript || selected < 0 ? tessel::FileScript : tessel::FileOpal;
+
+    ErrorSink sink;
+    ReaderWriter* object = nullptr;
+    const tessel::Long code =
+        session_->CompileFile(brickType, sourceType, fileName, &object, &sink, nullptr, nullptr);
+    if (code >= 0) {
+        DownloadObject(object);
+        BrickSession::ReleaseReaderWriter(&object);
+    } else {
+        // The error lies in the file, not in the editor: the caret stays where it is.
+        BrickSession::ReleaseReaderWriter(&object);
+        ShowError(code, &sink);
+        OfferTroubleShooter(code);
+    }
+    FocusEditor();
 }
 
 void TestClientDialog::OnReceive()
 {
-    // TODO: not written yet; shows nothing.
+    if (brickHandle_ == 0 || session_ == nullptr) {
+        // The box follows what is really switched on, not the click that was refused.
+        host_.SetCheck(handle(), IdReceive, receiving_);
+        ShowFailure("Port not open");
+        return;
+    }
+    receiving_ = host_.IsChecked(handle(), IdReceive);
+    if (receiving_)
+        session_->Exec(brickHandle_, nullptr, nullptr, nullptr, ReceiveCallback, CallbackContext());
+    else
+        session_->Exec(brickHandle_, nullptr, nullptr, nullptr, nullptr, nullptr);
 }
 
 void TestClientDialog::OnDownloadProgress(std::int32_t status, std::int32_t count)
 {
-    // TODO: not written yet; shows nothing.
+    if (status < 0) {
+        ShowError(status, nullptr);
+        OfferTroubleShooter(status);
+        return;
+    }
+    if (count != downloadTotal_) {
+        // 64 bits, so that a large count cannot overflow; a total of 0 (a later download
+        // found no code while this one ran) must not divide.
+        const std::int64_t percent =
+            downloadTotal_ > 0 ? static_cast<std::int64_t>(count) * 100 / downloadTotal_ : 0;
+        ShowStatusF("Downloading: %d%% done", static_cast<int>(percent));
+        return;
+    }
+    if (firmwarePending_) {
+        FinishFirmwareDownload();
+        return;
+    }
+    const std::uint32_t elapsed = host_.TickCount() - downloadStart_;
+    ShowStatusF("Downloaded ok (%d mS)", static_cast<int>(elapsed));
+    if (host_.IsChecked(handle(), IdAutoRun))
+        RunCommand(kStartCommand, tessel::BrickOnyx2);
+    if (stressIteration_ > 0)
+        host_.PostMessage(handle(), kMsgStressNext, 0, 0);
 }
 
 void TestClientDialog::OnExecResult(std::int32_t status, ReaderWriter* result)
 {
-    // TODO: not written yet; shows nothing. The posted file is ours to release.
+    // The posted file is ours on every path; it goes back before a Trouble Shooter run
+    // pumps messages.
+    if (status < 0) {
+        BrickSession::ReleaseReaderWriter(&result);
+        ShowError(status, nullptr);
+        OfferTroubleShooter(status);
+        return;
+    }
+    const std::unique_ptr<char[]> text = ReadFileText(result);
     BrickSession::ReleaseReaderWriter(&result);
+    if (text)
+        ShowStatusF("Exec result: %s", text.get());
+    else
+        ShowStatus("Exec ok");
 }
 
 void TestClientDialog::OnBrickMessage(std::int32_t status, std::int32_t number)
 {
-    // TODO: not written yet; shows nothing.
+    if (status >= 0) {
+        ShowStatusF("Received PBMessage: %d", static_cast<int>(number));
+        host_.Beep();
+    } else {
+        ShowFailureF("Received bad PBMessage, error: 0x%x", static_cast<unsigned>(status));
+    }
 }
 
 } // namespace ui
