@@ -419,21 +419,31 @@ bool Directory::removeAt(std::int32_t index)
     std::free(linkHere->name);
     std::free(linkHere);
 
-    if (entry->parent() == this) {
-        // Another directory still linking the entry becomes its parent, so that its name and
-        // path stay meaningful.
-        Directory* top = AsDirectory(root());
-        Directory* other = top != nullptr ? top->findParentOf(entry) : nullptr;
-        entry->setParent(other);
-        if (other != nullptr) {
-            other->addRef();
-        }
-        // The back reference goes without the take-apart test of release(): a directory that
-        // nobody else holds must not destroy itself in the middle of its own operation. It is
-        // then unheld, as a new directory is.
-        --refCount_;
+    if (entry->parent() != this) {
+        entry->release();
+        return true;
     }
-    entry->release();
+    // The back reference goes without the take-apart test of release(): a directory that nobody
+    // else holds must not destroy itself in the middle of its own operation. It is then unheld,
+    // as a new directory is.
+    --refCount_;
+    // Another directory still linking the entry becomes its parent, so that its name and path
+    // stay meaningful.
+    Directory* top = AsDirectory(root());
+    Directory* other = top != nullptr ? top->findParentOf(entry) : nullptr;
+    if (other != nullptr) {
+        entry->setParent(other);
+        other->addRef();
+        entry->release();
+        return true;
+    }
+    // Without another link the entry keeps this directory as parent while it is released, so
+    // that a directory taken apart by that release still searches the whole tree for other
+    // links of its own children (its root() is then the real top, not itself). An entry that
+    // survives, held elsewhere, is left without parent.
+    if (entry->release() != nullptr) {
+        entry->setParent(nullptr);
+    }
     return true;
 }
 
