@@ -366,7 +366,7 @@ tessel::Long BrickQueries::ReadMemory(tessel::Long hBrick, std::uint16_t address
 }
 
 tessel::Long BrickQueries::ReadMemoryRange(tessel::Long hBrick, std::uint16_t start,
-                                           tessel::Short length, ReaderWriter** file)
+                                           std::int32_t length, ReaderWriter** file)
 {
     if (file == nullptr) {
         return Argument();

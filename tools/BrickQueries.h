@@ -71,9 +71,10 @@ public:
                             ReaderWriter** resultFile);
     // A new file of its own (not the result working file, which each execution empties)
     // holding the range's bytes as one comma-separated list, read in chunks of at most
-    // kMemoryChunk bytes. The file goes to the caller, who releases it. Returns the code of
+    // kMemoryChunk bytes; the range stops at the top of the address space and a length below
+    // 1 is empty. The file goes to the caller, who releases it. Returns the code of
     // the last chunk read (success for an empty range); a failed chunk ends the walk.
-    tessel::Long ReadMemoryRange(tessel::Long hBrick, std::uint16_t start, tessel::Short length,
+    tessel::Long ReadMemoryRange(tessel::Long hBrick, std::uint16_t start, std::int32_t length,
                                  ReaderWriter** file);
 
 private:
