@@ -61,9 +61,9 @@ public:
     // files were all created.
     bool BuildWorkspace(const char* settingsPath);
     // Links the host file diskDirectory+name as workspaceDirectory+name (plain joins, no
-    // separator added). The workspace path is lower-cased; the host path stays as written,
-    // since host file systems may be case-sensitive. Null for an empty name or a failed
-    // insertion.
+    // separator added). The name is lower-cased in the workspace path, so the file is found
+    // only under its all-lower-case name; the host path stays as written, since host file
+    // systems may be case-sensitive. Null for an empty name or a failed insertion.
     DirEnt* MountDiskFile(const char* name, const char* diskDirectory,
                           const char* workspaceDirectory);
     // Links a new empty text memory file as workspaceDirectory+name; letter case is kept.

@@ -118,12 +118,15 @@ DirEnt* BrickSession::MountDiskFile(const char* name, const char* diskDirectory,
         return nullptr;
     }
     const std::string hostPath = std::string(diskDirectory != nullptr ? diskDirectory : "") + name;
-    std::string workspacePath =
-        std::string(workspaceDirectory != nullptr ? workspaceDirectory : "") + name;
-    // Lookup in the tree is case-sensitive, so every disk-backed file is reached under its
-    // all-lower-case name. The host path keeps its letters: on a case-sensitive file system
-    // lower-casing it would name another file.
-    ToLowerInPlace(workspacePath);
+    // Lookup in the tree is case-sensitive, so every disk-backed file is linked under its
+    // all-lower-case name, where the library looks for it ("/Script/Include/onyx2mlt.h");
+    // the workspace directories are our own names and keep their letters. The host path
+    // keeps its letters too: on a case-sensitive file system lower-casing it would name
+    // another file.
+    std::string lowerName(name);
+    ToLowerInPlace(lowerName);
+    const std::string workspacePath =
+        std::string(workspaceDirectory != nullptr ? workspaceDirectory : "") + lowerName;
 
     auto* entry = new (std::nothrow) DiskEntry(hostPath.c_str());
     if (entry == nullptr) {

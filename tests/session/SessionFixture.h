@@ -1,0 +1,88 @@
+// A session over the recording test library, built from a settings file in a scratch
+// directory, with a check that no workspace object outlives it.
+#pragma once
+
+#include <gtest/gtest.h>
+
+#include <filesystem>
+#include <memory>
+#include <string>
+
+#include "session/BrickSession.h"
+#include "tessel/DirEnt.h"
+#include "tessel/ReaderWriter.h"
+#include "testlib/TestSupport.h"
+#include "workspace/LiveObjects.h"
+
+class SessionTest : public ::testing::Test {
+protected:
+    void SetUp() override
+    {
+        ASSERT_TRUE(library.loaded()) << "recording library missing beside the tests";
+        ASSERT_FALSE(dir.path().empty());
+        ASSERT_EQ(workspace::LiveObjectCount(), 0);
+    }
+
+    void TearDown() override
+    {
+        session.reset();
+        EXPECT_EQ(workspace::LiveObjectCount(), 0) << "workspace objects outlived the session";
+    }
+
+    // paths: further lines of [PATHS]; rest: further sections.
+    std::string writeSettings(const std::string& paths, const std::string& rest,
+                              const std::string& dll = testsupport::RecordingLibraryDirectory())
+    {
+        return dir.write("harbor.ini", "[PATHS]\nDLL=" + dll + "\n" + paths + rest);
+    }
+
+    BrickSession& open(const std::string& paths = "",
+                       const std::string& rest = "[DEBUG]\nMEMFILES=TRUE\n",
+                       const std::string& dll = testsupport::RecordingLibraryDirectory())
+    {
+        settingsPath = writeSettings(paths, rest, dll);
+        session = std::make_unique<BrickSession>(settingsPath.c_str());
+        return *session;
+    }
+
+    // A session in disk mode with its working files in tmp/ and fw/ of the scratch directory.
+    BrickSession& openDisk(const std::string& rest = "")
+    {
+        std::filesystem::create_directories(dir.path() + "tmp");
+        std::filesystem::create_directories(dir.path() + "fw");
+        return open("TEMP=" + dir.path() + "tmp/\nFIRMWARE=" + dir.path() + "fw/\n", rest);
+    }
+
+    static std::string contentOf(ReaderWriter* handle)
+    {
+        std::string text;
+        if (handle == nullptr || !(handle->openRead() == RwOk)) {
+            return "<unreadable>";
+        }
+        char buffer[512];
+        for (std::int32_t got; (got = handle->read(buffer, sizeof buffer)) > 0;) {
+            text.append(buffer, static_cast<std::size_t>(got));
+        }
+        handle->close();
+        return text;
+    }
+
+    static std::string pathOf(DirEnt* entry)
+    {
+        if (entry == nullptr) {
+            return "<null>";
+        }
+        char* path = entry->path();
+        std::string copy = path != nullptr ? path : "<no memory>";
+        std::free(path);
+        return copy;
+    }
+
+    RecordingState& lib() { return library.state(); }
+    DirEnt* find(const char* path) { return session->root()->find(path); }
+
+    testsupport::RecordingLibrary library;
+    testsupport::TempDirectory dir;
+    std::string settingsPath;
+    std::unique_ptr<BrickSession> session;
+};
