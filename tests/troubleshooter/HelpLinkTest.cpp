@@ -1,0 +1,304 @@
+#include <gtest/gtest.h>
+
+#include <string>
+#include <vector>
+
+#include "FakeBrickCalls.h"
+#include "FakeWindowHost.h"
+#include "LogHelpers.h"
+#include "RecordingViewer.h"
+#include "platform/SystemInfoScripted.h"
+#include "troubleshooter/HelpLink.h"
+#include "troubleshooter/TroubleShooter.h"
+
+namespace {
+
+using Strings = std::vector<std::string>;
+
+std::string Jump(const char* topic)
+{
+    return std::string("JI(\"shooter.hlp\",\"") + topic + "\")";
+}
+
+constexpr std::int32_t Packed(std::uint32_t value)
+{
+    return static_cast<std::int32_t>(value);
+}
+
+class HelpProtocol : public testing::Test {
+protected:
+    // The help file sends a command, as a link of the shown topic would.
+    void Send(int id, ui::LParam argument = 0)
+    {
+        host.whenIdle.push_back([this, id, argument] {
+            host.PostMessage(viewer.lastOwner, ui::kMsgCommand, ui::MakeCommand(id), argument);
+        });
+    }
+
+    TempLog log;
+    FakeBrickCalls calls;
+    platform::ScriptedSystemInfo system;
+    tessel::Long handle = 5;
+    FakeWindowHost host;
+    RecordingViewer viewer;
+    TroubleShooter shooter{&calls, &handle, log.path(), &system};
+};
+
+TEST_F(HelpProtocol, LinkOwnsOneHiddenWindowOfItsClass)
+{
+    {
+        HelpLink link(&shooter, host, &viewer);
+        ASSERT_NE(link.window(), ui::kNoWindow);
+        EXPECT_EQ(host.windows.at(link.window()).first, "trbl_wnd");
+        EXPECT_FALSE(link.HelpOpen());
+    }
+    EXPECT_TRUE(host.windows.empty());
+    EXPECT_EQ(host.destroyed, 1);
+    EXPECT_TRUE(viewer.calls.empty());
+}
+
+TEST_F(HelpProtocol, ShowOutcomeOpensTheFileOnceAndShowsTheTopic)
+{
+    HelpLink link(&shooter, host, &viewer);
+    EXPECT_TRUE(link.ShowOutcome(1011));
+    EXPECT_TRUE(link.HelpOpen());
+    EXPECT_TRUE(link.ShowOutcome(1203));
+    EXPECT_EQ(viewer.calls, (Strings{"open shooter.hlp", "macro " + Jump("Download_interrupted"),
+                                     "macro " + Jump("COM_port_invalid")}));
+    EXPECT_EQ(viewer.lastOwner, link.window());
+}
+
+TEST_F(HelpProtocol, OutcomeWithoutTopicStillOpensTheHelp)
+{
+    HelpLink link(&shooter, host, &viewer);
+    EXPECT_FALSE(link.ShowOutcome(1310));
+    EXPECT_FALSE(link.ShowOutcome(1205));
+    EXPECT_TRUE(link.HelpOpen());
+    EXPECT_EQ(viewer.calls, Strings{"open shooter.hlp"});
+}
+
+TEST_F(HelpProtocol, OnlyAnAnswerOfExactlyOneOpensTheHelp)
+{
+    for (int answer : {0, 2, -1}) {
+        RecordingViewer refusing;
+        refusing.openAnswer = answer;
+        HelpLink link(&shooter, host, &refusing);
+        EXPECT_TRUE(link.ShowOutcome(1001));
+        EXPECT_FALSE(link.HelpOpen()) << answer;
+        // The next outcome tries to open the file again.
+        link.ShowOutcome(1001);
+        EXPECT_EQ(refusing.calls.size(), 4u);
+    }
+}
+
+TEST_F(HelpProtocol, WithoutViewerNothingOpens)
+{
+    HelpLink link(&shooter, host, nullptr);
+    EXPECT_TRUE(link.ShowOutcome(1001));
+    EXPECT_FALSE(link.HelpOpen());
+}
+
+TEST_F(HelpProtocol, TopicTableCoversEveryOutcomeGroup)
+{
+    const struct {
+        int outcome;
+        const char* topic;
+    } expected[] = {
+        {1001, "IR_Transmitter_not_found"},
+        {1002, "IR_Transmitter_or_cable_not_connected"},
+        {1003, "IR_Transmitter_not_working"},
+        {1004, "Onyx_not_alive"},
+        {1005, "UnlockPBrick_failed"},
+        {1006, "No_Onyx_firmware"},
+        {1007, "Not_an_Onyx"},
+        {1008, "Onyx_battery_voltage_too_low"},
+        {1009, "Onyx_memory_full"},
+        {1010, "Download_interrupted"},
+        {1012, "Download_interrupted"},
+        {1101, "USB_not_installed"},
+        {1102, "USB_Transmitter_not_installed"},
+        {1103, "USB_Transmitter_not_installed_properly"},
+        {1104, "Failed_to_set_IR_Transmitter_to_long_range"},
+        {1105, "USB_Transmitter_unplugged"},
+        {1201, "COM_port_not_free"},
+        {1202, "COM_port_not_working"},
+        {1203, "COM_port_invalid"},
+        {1204, "COM_port_used_by_serial_mouse"},
+        {1301, "Error_in_program"},
+        {1309, "Error_in_program"},
+        {1401, "Missing_system_component"},
+        {1410, "Missing_system_component"},
+    };
+    for (const auto& entry : expected) {
+        ASSERT_NE(HelpLink::TopicOf(entry.outcome), nullptr) << entry.outcome;
+        EXPECT_STREQ(HelpLink::TopicOf(entry.outcome), entry.topic);
+    }
+    for (int none : {0, 1000, 1013, 1100, 1106, 1200, 1205, 1300, 1310, 1400, 1411}) {
+        EXPECT_EQ(HelpLink::TopicOf(none), nullptr) << none;
+    }
+}
+
+TEST_F(HelpProtocol, TestComPortThreeOpensFoundTowerOnSuccess)
+{
+    HelpLink link(&shooter, host, &viewer);
+    calls.enumAnswers[3] = {{0, 1, "COM1"}, {0, 3, "COM3"}};
+    EXPECT_EQ(link.HandleHelpCommand(2004, 3), 0);
+    EXPECT_EQ(calls.calls[4], "Create(COM3)");
+    EXPECT_EQ(viewer.Macros(), Strings{Jump("Found_working_IR_Transmitter")});
+    EXPECT_EQ(log.body(), "\nTest serial tower:\n\tTest COM port COM3: ok\n\tCreate port COM3 ok\n"
+                          "\tSet brick type ok\n\tPort status ok\n");
+}
+
+TEST_F(HelpProtocol, ComPortNumberIsTheLowSixteenBitsOfTheArgument)
+{
+    HelpLink link(&shooter, host, &viewer);
+    calls.enumAnswers[3] = {{0, 1, "COM1"}, {0, 3, "COM3"}};
+    link.HandleHelpCommand(2004, 0x70003);
+    EXPECT_EQ(calls.calls[4], "Create(COM3)");
+}
+
+TEST_F(HelpProtocol, PortTypeCommandDecidesTheNextNoMoreItemsJump)
+{
+    HelpLink link(&shooter, host, &viewer);
+    Send(3001, 3);
+    Send(2007); // no COM port: ends with library code 82
+    Send(2000);
+    EXPECT_TRUE(shooter.Diagnose(Packed(0xE0050421u), &link));
+    EXPECT_EQ(viewer.Macros(), (Strings{Jump("IR_Transmitter_or_cable_not_connected"),
+                                        Jump("USB_Transmitter_not_installed")}));
+    EXPECT_EQ(shooter.portType(), 3);
+    EXPECT_FALSE(link.HelpOpen());
+    EXPECT_EQ(viewer.calls.back(), "quit shooter.hlp");
+    EXPECT_FALSE(host.quit);
+}
+
+TEST_F(HelpProtocol, CloseEndsThePumpOfTheDiagnosis)
+{
+    HelpLink link(&shooter, host, &viewer);
+    Send(2000);
+    EXPECT_TRUE(shooter.Diagnose(Packed(0xE0050401u), &link));
+    EXPECT_EQ(viewer.calls,
+              (Strings{"open shooter.hlp", "macro " + Jump("IR_Transmitter_not_found"),
+                       "quit shooter.hlp"}));
+    EXPECT_EQ(host.pumps, 1);
+}
+
+TEST_F(HelpProtocol, FailedTestJumpsToItsOwnOutcome)
+{
+    HelpLink link(&shooter, host, &viewer);
+    calls.lastStatus[3] = 4; // the brick's status: no tower
+    Send(2003);
+    Send(2000);
+    shooter.Diagnose(Packed(0xE0050402u), &link);
+    EXPECT_EQ(viewer.Macros(),
+              (Strings{Jump("Onyx_not_alive"), Jump("IR_Transmitter_or_cable_not_connected")}));
+}
+
+TEST_F(HelpProtocol, EachTestOpensItsSuccessTopic)
+{
+    HelpLink link(&shooter, host, &viewer);
+    calls.findPortAnswers = {{0, "COM1"}};
+    calls.enumAnswers[3] = {{0, 1, "COM1"}};
+    calls.enumAnswers[4] = {{0, 1, "KIVOTOWER1"}};
+    link.HandleHelpCommand(2001, 0);
+    link.HandleHelpCommand(2002, 0);
+    link.HandleHelpCommand(2003, 0);
+    link.HandleHelpCommand(2006, 2);
+    link.HandleHelpCommand(2007, 0);
+    link.HandleHelpCommand(2008, 0);
+    EXPECT_EQ(viewer.Macros(),
+              (Strings{Jump("Found_working_IR_Transmitter"), Jump("IR_Transmitter_ok"),
+                       Jump("Onyx_ok"), Jump("IR_Transmitter_range_set_ok"),
+                       Jump("Found_working_COM_port"), Jump("Found_working_IR_Transmitter")}));
+    const std::string body = log.body();
+    EXPECT_NE(body.find("\nFind Tower:\n"), std::string::npos);
+    EXPECT_NE(body.find("\nFind USB Tower:\n\tEnum USB ports ok\n"), std::string::npos);
+    EXPECT_NE(body.find("\nSet USB Range:\n\tSet range ok\n"), std::string::npos);
+}
+
+TEST_F(HelpProtocol, RepairedUsbTowerLetsTheArgumentStand)
+{
+    HelpLink link(&shooter, host, &viewer);
+    calls.portKind = 3;
+    // Answering at the diagnosis, lost before each of the two commands, found again by each.
+    calls.statusAnswers[2] = {1, 4, 1, 4, 1};
+    calls.findPortAnswers = {{0, "KIVOTOWER"}, {0, "KIVOTOWER"}};
+    Send(2001, 0);
+    Send(2008, Packed(0xE0050413u));
+    Send(2000);
+    shooter.Diagnose(Packed(0xE0050401u), &link);
+    EXPECT_EQ(viewer.Macros(),
+              (Strings{Jump("IR_Transmitter_not_found"), Jump("Found_working_IR_Transmitter"),
+                       Jump("Failed_to_set_IR_Transmitter_to_long_range")}));
+    EXPECT_EQ(log.body().find("Find Tower:"), std::string::npos);
+    EXPECT_EQ(log.body().find("Enum USB ports"), std::string::npos);
+}
+
+TEST_F(HelpProtocol, UnknownCommandsDoNothing)
+{
+    HelpLink link(&shooter, host, &viewer);
+    calls.forbidCalls = true;
+    for (int id : {1999, 2005, 2009, 3000, 3002, 0}) {
+        EXPECT_EQ(link.HandleHelpCommand(id, 1), 0);
+    }
+    EXPECT_TRUE(viewer.calls.empty());
+    EXPECT_EQ(log.body(), "");
+}
+
+TEST_F(HelpProtocol, WithoutTroubleShooterOnlyCloseActs)
+{
+    HelpLink link(nullptr, host, &viewer);
+    calls.forbidCalls = true;
+    for (int id : {2001, 2002, 2003, 2004, 2006, 2007, 2008, 3001}) {
+        link.HandleHelpCommand(id, 3);
+    }
+    EXPECT_TRUE(viewer.calls.empty());
+    link.ShowOutcome(1001);
+    link.HandleHelpCommand(2000, 0);
+    EXPECT_FALSE(link.HelpOpen());
+    EXPECT_EQ(viewer.calls.back(), "quit shooter.hlp");
+}
+
+TEST_F(HelpProtocol, CommandMessagesReachTheLinkThroughItsWindow)
+{
+    HelpLink link(&shooter, host, &viewer);
+    link.ShowOutcome(1001);
+    EXPECT_EQ(host.SendMessage(link.window(), ui::kMsgCommand, ui::MakeCommand(2000, 1), 0), 0);
+    EXPECT_FALSE(link.HelpOpen());
+    // Other messages are left to the default processing.
+    ui::LResult result = 7;
+    EXPECT_EQ(host.SendMessage(link.window(), 0x0200, 0, 0), 0);
+    EXPECT_EQ(result, 7);
+}
+
+TEST_F(HelpProtocol, QuitRequestEndsTheRunAndStaysPending)
+{
+    HelpLink link(&shooter, host, &viewer);
+    host.whenIdle.push_back([this] { host.PostQuit(0); });
+    EXPECT_TRUE(shooter.Diagnose(Packed(0xE0050401u), &link));
+    EXPECT_FALSE(link.HelpOpen());
+    EXPECT_TRUE(host.quit);
+    EXPECT_EQ(viewer.calls.back(), "quit shooter.hlp");
+}
+
+TEST_F(HelpProtocol, MissingHelpFileEndsTheRunAtOnceWithTheDiagnosisLogged)
+{
+    viewer.openAnswer = 0;
+    HelpLink link(&shooter, host, &viewer);
+    EXPECT_TRUE(shooter.Diagnose(Packed(0xE0050421u), &link));
+    EXPECT_EQ(host.pumps, 0);
+    shooter.CloseLog();
+    EXPECT_NE(log.body().find("\tDiagnosing Error failed:\n"), std::string::npos);
+    EXPECT_NE(log.body().find("\nTrouble Shooter closed\n"), std::string::npos);
+}
+
+TEST_F(HelpProtocol, LinkClosesAHelpStillOpenWhenItGoes)
+{
+    {
+        HelpLink link(&shooter, host, &viewer);
+        link.ShowOutcome(1001);
+    }
+    EXPECT_EQ(viewer.calls.back(), "quit shooter.hlp");
+}
+
+} // namespace
