@@ -1,0 +1,2 @@
+// A test header.
+#define THREE 3
