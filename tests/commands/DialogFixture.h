@@ -1,0 +1,81 @@
+// The dialog on the headless host against the simulated library, as a test fixture.
+//
+// Each test writes a scenario for the simulator and a settings file into a directory of its
+// own, constructs the dialog with a command line whose program path lies in that directory
+// (so the settings file is found beside it), and drives it as a user would: clicking controls,
+// typing into edits, answering questions. Everything the user would see arrives as events.
+#pragma once
+
+#include <gtest/gtest.h>
+
+#include <filesystem>
+#include <memory>
+#include <string>
+#include <vector>
+
+#include "ui/TestClientDialog.h"
+#include "ui/headless/HeadlessHost.h"
+
+namespace commands_test {
+
+// Scenario lines every test starts from: no simulated transmission time.
+inline constexpr const char* kFastLink = "link-time = 0\n";
+
+// A program object with count sound commands in task 0, as the library's translation would
+// write it; downloaded as BIN source it is used without translation.
+std::string SoundProgram(int count, int brickType = 6);
+
+class DialogFixture : public ::testing::Test {
+protected:
+    void SetUp() override;
+    void TearDown() override;
+
+    // Writes the scenario and the settings (the [PORTS] lines and the [OPTIONS] lines are
+    // given; the library's directory and memory files are always set), then constructs and
+    // creates the dialog. fileArgument is the command line's file, "" for none.
+    void Start(const std::string& scenario, const std::string& ports = "",
+               const std::string& options = "", const std::string& fileArgument = "");
+    // Destroys the dialog (and with it the session); the library is terminated.
+    void Stop();
+
+    ui::TestClientDialog& dialog() { return *dialog_; }
+    ui::HeadlessHost& host() { return *host_; }
+    ui::WindowHandle window() { return dialog_->handle(); }
+    const std::filesystem::path& dir() const { return dir_; }
+
+    // A click as the user makes it; fails the test when the control is disabled.
+    void Click(int id);
+    void SetText(int id, const std::string& text);
+    std::string Text(int id);
+    void SelectSource(int index);
+    void SelectBrick(int index);
+    void SetChecked(int id, bool checked);
+
+    // Handles posted reports until no download or execution is in flight and nothing is
+    // queued. Fails the test when a report does not arrive within a generous bound (a hang).
+    void Settle();
+    // Handles posted reports until count status texts satisfy accept, or fails as above.
+    void WaitForStatuses(std::size_t count, bool (*accept)(const std::string&));
+
+    // Status box texts shown since the last ClearEvents, in order.
+    std::vector<std::string> Statuses() const;
+    std::string LastStatus() const;
+    std::vector<ui::HeadlessEvent> EventsOf(ui::HeadlessEvent::Kind kind) const;
+    // Questions of the Trouble Shooter offers ("Diagnostics").
+    std::vector<std::string> Offers() const;
+    void ClearEvents() { events_.clear(); }
+
+    std::string WriteFile(const std::string& name, const std::string& bytes);
+    static std::string ReadFile(const std::filesystem::path& path);
+
+    // Property value read through the dialog's own session.
+    std::int16_t Property(std::int16_t property);
+
+private:
+    std::filesystem::path dir_;
+    std::unique_ptr<ui::HeadlessHost> host_;
+    std::unique_ptr<ui::TestClientDialog> dialog_;
+    std::vector<ui::HeadlessEvent> events_;
+};
+
+} // namespace commands_test
