@@ -1,0 +1,370 @@
+// Every entry point of the simulated library through the module's export table: ports, handles,
+// enumerations, properties, status requests, capacities and bad arguments.
+#include <cstring>
+#include <fstream>
+#include <sstream>
+#include <unistd.h>
+
+#include "SimHarness.h"
+
+namespace simtest {
+namespace {
+
+using tessel::Long;
+using tessel::Short;
+
+constexpr Long kNoMoreItems = Code(0xE0050C52u);
+constexpr Long kNullParameter = Code(0xE0050C64u);
+constexpr Long kBadHandle = Code(0xE0050401u);
+
+TEST(ExportTable, NamesTheSixteenEntryPointsInSlotOrder)
+{
+    const Api& a = Library();
+    ASSERT_NE(a.table, nullptr);
+    int count = 0;
+    for (const tessel::ExportEntry* entry = a.table; entry->name != nullptr; ++entry, ++count) {
+        ASSERT_LT(count, tessel::SlotCount);
+        EXPECT_STREQ(entry->name, tessel::kExportNames[count]);
+        EXPECT_NE(entry->address, nullptr);
+    }
+    EXPECT_EQ(count, tessel::SlotCount);
+    // Nothing else of the module is visible by name.
+    EXPECT_EQ(dlsym(a.module, "tslCreate"), nullptr);
+    EXPECT_EQ(dlsym(a.module, tessel::kExportNames[tessel::SlotCreate]), nullptr);
+}
+
+class Ports : public SimTest {};
+
+TEST_F(Ports, FindPortWalksTheTowersAndEnds)
+{
+    char name[tessel::kPathSize] = "";
+    ASSERT_EQ(api().findPort(name, sizeof name), 0);
+    EXPECT_STREQ(name, "KIVOTOWER1");
+    ASSERT_EQ(api().findPort(name, sizeof name), 0);
+    EXPECT_STREQ(name, "COM1");
+    EXPECT_EQ(api().findPort(name, sizeof name), kNoMoreItems);
+}
+
+TEST_F(Ports, FindPortNeverWritesPastTheBuffer)
+{
+    char name[8] = "";
+    std::memset(name + 1, 'x', sizeof name - 1);
+    EXPECT_LT(api().findPort(name, 4), 0); // "KIVOTOWER1" does not fit
+    EXPECT_EQ(name[4], 'x');
+    EXPECT_EQ(api().findPort(nullptr, 260), kNullParameter);
+}
+
+TEST_F(Ports, CreateTakesNamesWithOrWithoutThePrefix)
+{
+    const Long usb = open("\\\\.\\KIVOTOWER1");
+    const Long serial = open("COM1");
+    EXPECT_NE(usb, 0);
+    EXPECT_NE(serial, 0);
+    EXPECT_NE(usb, serial);
+    EXPECT_EQ(open("COM7"), 0);
+    EXPECT_EQ(open(nullptr), 0);
+    EXPECT_EQ(api().destroy(usb), 0);
+    EXPECT_EQ(api().destroy(usb), kBadHandle);
+}
+
+TEST_F(Ports, APortHeldByAHandleIsReportedLive)
+{
+    Short item = 0;
+    char name[tessel::kPathSize];
+    EXPECT_EQ(api().findFirst(tessel::EnumComPorts, &item, name, sizeof name), 0);
+    EXPECT_STREQ(name, "COM1");
+    EXPECT_EQ(item, 1);
+    const Long handle = open("COM1");
+    ASSERT_NE(handle, 0);
+    EXPECT_EQ(api().findFirst(tessel::EnumComPorts, &item, name, sizeof name), Code(0xE0050454u));
+    EXPECT_EQ(open("COM1"), 0); // one handle per port
+    api().destroy(handle);
+    EXPECT_EQ(api().findFirst(tessel::EnumComPorts, &item, name, sizeof name), 0);
+}
+
+TEST_F(Ports, ComPortFaultsCarryTheirDriverCodes)
+{
+    useScenario("[port COM1]\nstate = in-use\n[port COM2]\nstate = conflict\n"
+                "[port COM3]\nstate = missing\n[port COM4]\nstate = serial-mouse\n"
+                "[port COM5]\n");
+    Short item = 0;
+    char name[tessel::kPathSize];
+    std::vector<std::pair<std::string, Long>> seen;
+    Long result = api().findFirst(tessel::EnumComPorts, &item, name, sizeof name);
+    while (result != kNoMoreItems && seen.size() < 10) {
+        seen.emplace_back(name, result);
+        result = api().findNext(tessel::EnumComPorts, &item, name, sizeof name);
+    }
+    const std::vector<std::pair<std::string, Long>> expected = {{"COM1", Code(0xE0050450u)},
+                                                                {"COM2", Code(0xE0050451u)},
+                                                                {"COM3", Code(0xE0050452u)},
+                                                                {"COM4", Code(0xE0050453u)},
+                                                                {"COM5", 0}};
+    EXPECT_EQ(seen, expected);
+    EXPECT_EQ(item, 5);
+    // A usable port with a tower is found; the unusable ones cannot be opened.
+    char port[tessel::kPathSize] = "";
+    EXPECT_EQ(api().findPort(port, sizeof port), 0);
+    EXPECT_STREQ(port, "COM5");
+    EXPECT_EQ(open("COM1"), 0);
+}
+
+TEST_F(Ports, TheSearchAnswersWhyTheOnlyTowerCannotBeUsed)
+{
+    useShipped("com-in-use.sim");
+    char name[tessel::kPathSize] = "";
+    EXPECT_EQ(api().findPort(name, sizeof name), Code(0xE0050450u));
+    useShipped("no-tower.sim");
+    name[0] = '\0';
+    EXPECT_EQ(api().findPort(name, sizeof name), kNoMoreItems);
+}
+
+class Enumerations : public SimTest {};
+
+TEST_F(Enumerations, ListBrickSourceAndTargetTypes)
+{
+    Short item = 0;
+    char name[tessel::kPathSize];
+    std::vector<std::string> names;
+    for (Long r = api().findFirst(tessel::EnumBrickTypes, &item, name, sizeof name); r >= 0;
+         r = api().findNext(tessel::EnumBrickTypes, &item, name, sizeof name)) {
+        names.push_back(name);
+        ASSERT_LT(names.size(), 20u);
+    }
+    EXPECT_NE(std::find(names.begin(), names.end(), "Onyx2"), names.end());
+    EXPECT_NE(std::find(names.begin(), names.end(), "Rover"), names.end());
+    EXPECT_EQ(api().findFirst(tessel::EnumSourceTypes, &item, name, sizeof name), 0);
+    EXPECT_EQ(api().findFirst(tessel::EnumTargetTypes, &item, name, sizeof name), 0);
+    EXPECT_EQ(api().findFirst(tessel::EnumUsbPorts, &item, name, sizeof name), 0);
+    EXPECT_STREQ(name, "KIVOTOWER1");
+    EXPECT_EQ(api().findNext(tessel::EnumUsbPorts, &item, name, sizeof name), kNoMoreItems);
+}
+
+TEST_F(Enumerations, RejectUnknownTypesAndNullArguments)
+{
+    Short item = 0;
+    char name[tessel::kPathSize];
+    EXPECT_EQ(api().findFirst(9, &item, name, sizeof name), Code(0xE0050C53u));
+    EXPECT_EQ(api().findNext(-1, &item, name, sizeof name), Code(0xE0050C53u));
+    EXPECT_EQ(api().findNext(tessel::EnumComPorts, nullptr, name, sizeof name), Code(0xE0050C51u));
+    EXPECT_EQ(api().findFirst(tessel::EnumComPorts, nullptr, name, sizeof name), kNullParameter);
+    EXPECT_EQ(api().findFirst(tessel::EnumComPorts, &item, nullptr, 260), kNullParameter);
+}
+
+TEST_F(Enumerations, CutNamesToTheBuffer)
+{
+    Short item = 0;
+    char name[6];
+    std::memset(name, 'x', sizeof name);
+    EXPECT_EQ(api().findFirst(tessel::EnumUsbPorts, &item, name, 4), 0);
+    EXPECT_STREQ(name, "KIV");
+    EXPECT_EQ(name[4], 'x');
+}
+
+class Properties : public SimTest {};
+
+TEST_F(Properties, PortKindNameAndRangeOfAUsbTower)
+{
+    const Long handle = open("KIVOTOWER1");
+    Short value = 0;
+    char text[tessel::kPathSize];
+    ASSERT_EQ(api().get(handle, tessel::PropPort, &value, text, sizeof text), 0);
+    EXPECT_EQ(value, tessel::PortUsb);
+    EXPECT_STREQ(text, "KIVOTOWER1");
+    ASSERT_EQ(api().get(handle, tessel::PropLongRange, &value, nullptr, 0), 0);
+    EXPECT_EQ(value, tessel::kLongRangeAvailable);
+    EXPECT_EQ(api().set(handle, tessel::PropRange, tessel::RangeLong), 0);
+    ASSERT_EQ(api().get(handle, tessel::PropRange, &value, nullptr, 0), 0);
+    EXPECT_EQ(value, tessel::RangeLong);
+    EXPECT_EQ(api().set(handle, tessel::PropRange, 4), Code(0xE0050410u));
+}
+
+TEST_F(Properties, RangeBelongsToUsbTowersOnly)
+{
+    const Long serial = open("COM1");
+    Short value = 0;
+    char text[tessel::kPathSize];
+    ASSERT_EQ(api().get(serial, tessel::PropPort, &value, text, sizeof text), 0);
+    EXPECT_EQ(value, tessel::PortSerialIr);
+    EXPECT_LT(api().get(serial, tessel::PropRange, &value, nullptr, 0), 0);
+    EXPECT_LT(api().set(serial, tessel::PropRange, tessel::RangeShort), 0);
+    EXPECT_LT(api().get(serial, tessel::PropLongRange, &value, nullptr, 0), 0);
+}
+
+TEST_F(Properties, LongRangeFailsWhereTheTowerHasNone)
+{
+    useShipped("short-range.sim");
+    const Long handle = open("KIVOTOWER1");
+    Short value = 0;
+    ASSERT_EQ(api().get(handle, tessel::PropLongRange, &value, nullptr, 0), 0);
+    EXPECT_NE(value, tessel::kLongRangeAvailable);
+    EXPECT_EQ(api().set(handle, tessel::PropRange, tessel::RangeLong), Code(0xE0050413u));
+    EXPECT_EQ(api().set(handle, tessel::PropRange, tessel::RangeShort), 0);
+}
+
+TEST_F(Properties, StatisticsCountTheTrafficAfterCollectionStarts)
+{
+    const Long handle = open("KIVOTOWER1");
+    char text[tessel::kStatusTextSize];
+    EXPECT_EQ(api().get(handle, tessel::PropStatistics, nullptr, text, sizeof text),
+              Code(0xE1000206u));
+    ASSERT_EQ(api().set(handle, tessel::PropCollectStats, 1), 0);
+    ASSERT_EQ(api().get(handle, tessel::PropStatistics, nullptr, text, sizeof text), 0);
+    EXPECT_NE(std::strstr(text, "0 packets"), nullptr) << text;
+    Short type = 0;
+    ASSERT_EQ(api().findBrick(handle, &type, nullptr), 0);
+    ASSERT_EQ(api().findBrick(handle, &type, nullptr), 0);
+    ASSERT_EQ(api().get(handle, tessel::PropStatistics, nullptr, text, sizeof text), 0);
+    EXPECT_NE(std::strstr(text, "2 packets"), nullptr) << text;
+    EXPECT_NE(std::strstr(text, "sim"), nullptr) << text; // labelled as simulated
+    char tiny[5];
+    std::memset(tiny, 'x', sizeof tiny);
+    ASSERT_EQ(api().get(handle, tessel::PropStatistics, nullptr, tiny, 4), 0);
+    EXPECT_EQ(std::strlen(tiny), 3u);
+    EXPECT_EQ(tiny[4], 'x');
+}
+
+TEST_F(Properties, EveryReadablePropertyAnswers)
+{
+    const Long handle = open("KIVOTOWER1");
+    for (Short property : {1, 3, 4, 5, 6, 7, 8, 11, 12, 13, 14}) {
+        Short value = -1;
+        char text[tessel::kBrickNameSize] = "";
+        EXPECT_EQ(api().get(handle, property, &value, text, sizeof text), 0) << property;
+        EXPECT_GE(value, 0) << property;
+    }
+    Short value = 0;
+    char name[tessel::kBrickNameSize];
+    ASSERT_EQ(api().get(handle, tessel::PropBrickType, &value, name, sizeof name), 0);
+    EXPECT_EQ(value, tessel::BrickOnyx2);
+    EXPECT_NE(std::strstr(name, "Onyx2"), nullptr);
+}
+
+TEST_F(Properties, UnknownPropertiesAndHandles)
+{
+    const Long handle = open("KIVOTOWER1");
+    Short value = 0;
+    EXPECT_EQ(api().get(handle, 2, &value, nullptr, 0), Code(0xE0050C61u));
+    EXPECT_EQ(api().set(handle, 99, 1), Code(0xE0050C61u));
+    EXPECT_EQ(api().get(handle, tessel::PropExecRetries, nullptr, nullptr, 0), kNullParameter);
+    EXPECT_EQ(api().get(12345, tessel::PropPort, &value, nullptr, 0), kBadHandle);
+    EXPECT_EQ(api().set(0, tessel::PropRange, 1), kBadHandle);
+    EXPECT_EQ(api().set(handle, tessel::PropBrickType, 5), 0);
+    ASSERT_EQ(api().get(handle, tessel::PropBrickType, &value, nullptr, 0), 0);
+    EXPECT_EQ(value, tessel::BrickRover);
+}
+
+TEST_F(Properties, TraceOptionsAppendLinesToTheTraceFile)
+{
+    char directory[] = "/tmp/simcore-trace-XXXXXX";
+    ASSERT_NE(mkdtemp(directory), nullptr);
+    char previous[4096];
+    ASSERT_NE(getcwd(previous, sizeof previous), nullptr);
+    ASSERT_EQ(chdir(directory), 0);
+    {
+        std::ofstream header("tsltrace.txt");
+        header << "Trace file \"tsltrace.txt\", options: 3\n\n";
+    }
+    EXPECT_EQ(api().set(0, tessel::PropTrace, 3), 0);
+    const Long handle = open("COM1");
+    Short type = 0;
+    api().findBrick(handle, &type, nullptr);
+    api().set(0, tessel::PropTrace, 0);
+    open("KIVOTOWER1"); // not traced any more
+    std::ifstream file("tsltrace.txt");
+    std::stringstream content;
+    content << file.rdbuf();
+    const std::string text = content.str();
+    std::remove("tsltrace.txt");
+    ASSERT_EQ(chdir(previous), 0);
+    rmdir(directory);
+    EXPECT_EQ(text.rfind("Trace file", 0), 0u);
+    EXPECT_NE(text.find("tslCreate(COM1)"), std::string::npos) << text;
+    EXPECT_NE(text.find("packet"), std::string::npos) << text;
+    EXPECT_EQ(text.find("KIVOTOWER1"), std::string::npos) << text;
+}
+
+class Status : public SimTest {};
+
+TEST_F(Status, PortAndBrickOfAWorkingInstallation)
+{
+    const Long handle = open("KIVOTOWER1");
+    char text[tessel::kStatusTextSize];
+    EXPECT_EQ(api().status(handle, tessel::StatusPort, nullptr, 0), 1);
+    EXPECT_EQ(api().status(handle, tessel::StatusBrick, text, sizeof text), tessel::kBrickAnswers);
+    EXPECT_EQ(api().status(0, tessel::StatusPort, nullptr, 0), 3);
+    EXPECT_EQ(api().status(handle, tessel::StatusDownloadProgress, nullptr, 0), 0);
+    // A brick type property that differs from the brick makes the client detect it again.
+    api().set(handle, tessel::PropBrickType, tessel::BrickRover);
+    EXPECT_EQ(api().status(handle, tessel::StatusBrick, text, sizeof text),
+              tessel::kBrickTypeChanged);
+}
+
+struct StatusCase {
+    const char* scenario;
+    const char* port;
+    Long portStatus;
+    Long brickStatus;
+    Long findBrick;
+};
+
+class StatusByScenario : public SimTest, public ::testing::WithParamInterface<StatusCase> {};
+
+TEST_P(StatusByScenario, MatchesTheFault)
+{
+    const StatusCase& c = GetParam();
+    useShipped(c.scenario);
+    const Long handle = open(c.port);
+    ASSERT_NE(handle, 0);
+    char text[tessel::kStatusTextSize] = "";
+    EXPECT_EQ(api().status(handle, tessel::StatusPort, nullptr, 0), c.portStatus);
+    EXPECT_EQ(api().status(handle, tessel::StatusBrick, text, sizeof text), c.brickStatus);
+    EXPECT_GT(std::strlen(text), 0u);
+    Short type = -1;
+    EXPECT_EQ(api().findBrick(handle, &type, nullptr), c.findBrick);
+}
+
+INSTANTIATE_TEST_SUITE_P(
+    Scenarios, StatusByScenario,
+    ::testing::Values(StatusCase{"no-tower.sim", "COM1", 4, 4, Code(0xE0050421u)},
+                      StatusCase{"tower-dead.sim", "COM1", 5, 5, Code(0xE005040Bu)},
+                      StatusCase{"brick-off.sim", "COM1", 1, 6, Code(0xE0050402u)},
+                      StatusCase{"no-firmware.sim", "KIVOTOWER1", 1, 7, 0},
+                      StatusCase{"low-battery.sim", "KIVOTOWER1", 1, 8, 0},
+                      StatusCase{"unlock-failed.sim", "KIVOTOWER1", 1, 14, 0},
+                      StatusCase{"not-an-onyx.sim", "KIVOTOWER1", 1, 9, 0}));
+
+class Capacities : public SimTest {};
+
+TEST_F(Capacities, EveryInfoIdOfTheBrickTypes)
+{
+    for (Short id : {1, 2, 3, 4, 5, 6, 7, 8, 11, 13, 14, 15, 18}) {
+        Short value = -1;
+        EXPECT_EQ(api().info(tessel::BrickOnyx2, id, &value), 0) << id;
+        EXPECT_GE(value, 0) << id;
+    }
+    Short slots = 0;
+    ASSERT_EQ(api().info(tessel::BrickOnyx2, tessel::InfoProgramSlots, &slots), 0);
+    EXPECT_EQ(slots, 5);
+    ASSERT_EQ(api().info(tessel::BrickRover, tessel::InfoProgramSlots, &slots), 0);
+    EXPECT_EQ(slots, 1);
+    Short value = 0;
+    EXPECT_EQ(api().info(tessel::BrickOnyx2, 9, &value), Code(0xE0050C54u));
+    EXPECT_EQ(api().info(tessel::BrickOnyx2, 1, nullptr), kNullParameter);
+    EXPECT_LT(api().info(42, 1, &value), 0);
+}
+
+TEST_F(Capacities, FindBrickNamesTheBrickInFront)
+{
+    useShipped("rover.sim");
+    const Long handle = open("COM1");
+    Short type = 0;
+    Long extra = -1;
+    ASSERT_EQ(api().findBrick(handle, &type, &extra), 0);
+    EXPECT_EQ(type, tessel::BrickRover);
+    EXPECT_EQ(api().findBrick(handle, nullptr, &extra), kNullParameter);
+    EXPECT_EQ(api().findBrick(999, &type, &extra), kBadHandle);
+}
+
+} // namespace
+} // namespace simtest
