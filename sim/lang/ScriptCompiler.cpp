@@ -213,6 +213,7 @@ private:
         out_.listing.programName = std::string(name.text);
         out_.program.kind = ObjectKind::Program;
         addSymbolLine("program", 0, name.text);
+        const Token& open = peek();
         expect("{");
         std::vector<RoutineDecl> routines;
         bool haveMain = false;
@@ -222,6 +223,9 @@ private:
             const Token& t = peek();
             if (t.is("}")) {
                 break;
+            }
+            if (t.kind == Tok::End) { // the program's braces do not close
+                Fail(kSyntax, open.offset, "{");
             }
             if (t.is(";")) {
                 take();

@@ -1,0 +1,4 @@
+; expect error 131 at "version": version
+task 0
+    version
+end

@@ -1,0 +1,4 @@
+; expect error 1 at "jump": jump
+task 0
+    jump somewhere
+end
