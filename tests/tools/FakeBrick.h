@@ -62,9 +62,14 @@ public:
     std::map<std::uint16_t, tessel::Long> numbers;
     // Commands whose execution fails, by exact text.
     std::vector<std::string> failing;
+    // Every execution fails: the brick does not answer.
+    bool silent = false;
     std::map<int, std::vector<EnumItem>> enums;
-    // The enumeration of this type never reports "no more items".
+    // The enumeration of this type never reports "no more items"; its names carry the padding.
     int endlessEnum = -1;
+    std::string endlessPadding;
+    // On a Rover, addresses name 16-bit cells, read low byte first.
+    std::map<std::uint16_t, std::uint16_t> roverCells;
     // What the brick was asked, in order.
     std::vector<std::string> commands;
 
@@ -97,10 +102,8 @@ public:
     // Rover tables: two little-endian words at each address.
     void PutRoverPair(std::uint16_t address, std::uint16_t first, std::uint16_t second)
     {
-        memory[address] = first & 0xFF;
-        memory[address + 1] = first >> 8;
-        memory[address + 2] = second & 0xFF;
-        memory[address + 3] = second >> 8;
+        roverCells[address] = first;
+        roverCells[static_cast<std::uint16_t>(address + 1)] = second;
     }
 
     std::string CodeBytes(std::uint16_t start, int count) const { return ByteList(start, count); }
@@ -180,10 +183,8 @@ public:
             file->close();
             *resultFile = file;
         }
-        for (const std::string& f : failing) {
-            if (f == text)
-                return kExecFailed;
-        }
+        if (Fails(text))
+            return kExecFailed;
         std::string answer;
         tessel::Long number = 0;
         unsigned address = 0;
@@ -213,10 +214,8 @@ public:
     tessel::Long RunImmediate(tessel::Long, const char* text, tessel::Long* result) override
     {
         commands.push_back(text);
-        for (const std::string& f : failing) {
-            if (f == text)
-                return kExecFailed;
-        }
+        if (Fails(text))
+            return kExecFailed;
         unsigned address = 0;
         int count = 0;
         if (std::sscanf(text, "get 0x%x,%d", &address, &count) != 2)
@@ -228,6 +227,17 @@ public:
     }
 
 private:
+    bool Fails(const std::string& text) const
+    {
+        if (silent)
+            return true;
+        for (const std::string& f : failing) {
+            if (f == text)
+                return true;
+        }
+        return false;
+    }
+
     static std::string Hex(unsigned value, bool comma)
     {
         char text[8];
@@ -239,8 +249,17 @@ private:
     {
         std::string list;
         for (int i = 0; i < count; ++i)
-            list += Hex(memory[(start + i) & 0xFFFF], i + 1 < count);
+            list += Hex(ByteAt(start, i), i + 1 < count);
         return list;
+    }
+
+    std::uint8_t ByteAt(std::uint16_t start, int i) const
+    {
+        if (brickType != tessel::BrickRover)
+            return memory[(start + i) & 0xFFFF];
+        auto cell = roverCells.find(static_cast<std::uint16_t>(start + i / 2));
+        std::uint16_t value = cell != roverCells.end() ? cell->second : 0;
+        return static_cast<std::uint8_t>(i % 2 == 0 ? value & 0xFF : value >> 8);
     }
 
     static void Copy(const std::string& from, char* text, tessel::Size size)
@@ -252,7 +271,7 @@ private:
     tessel::Long Item(tessel::Short type, int index, char* name, tessel::Size size)
     {
         if (type == endlessEnum) {
-            Copy("COM" + std::to_string(index + 1), name, size);
+            Copy("COM" + std::to_string(index + 1) + endlessPadding, name, size);
             return kOk;
         }
         const std::vector<EnumItem>& items = enums[type];
