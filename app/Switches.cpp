@@ -39,7 +39,7 @@ SwitchAction FindRegistrationSwitch(const char* commandLine)
 bool ParseHarborOptions(int argc, const char* const* argv, HarborOptions& options,
                         std::string& error)
 {
-    options.arguments.clear();
+    options = HarborOptions{};
     options.arguments.emplace_back(argc > 0 && argv[0] ? argv[0] : "harbor");
     int i = 1;
     for (; i < argc; ++i) {

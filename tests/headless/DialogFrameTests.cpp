@@ -1,0 +1,481 @@
+// The dialog frame on the headless host: the control table and menu, the routing, the
+// custom messages, the shared helpers, initialisation and teardown.
+#include <gtest/gtest.h>
+
+#include <cstring>
+#include <fstream>
+#include <set>
+#include <string>
+
+#include "FrameFixture.h"
+#include "session/BrickSession.h"
+#include "tessel/DirEnt.h"
+#include "testlib/TestSupport.h"
+#include "ui/TestClientDialog.h"
+
+using namespace ui;
+using headless_test::FrameFixture;
+using Kind = ui::HeadlessEvent::Kind;
+
+namespace {
+
+struct ControlExpectation {
+    int id;
+    ControlKind kind;
+    const char* caption;
+    bool visible;
+    bool enabled;
+};
+
+// Every control with an id, as a user meets it after start-up.
+const ControlExpectation kExpectedControls[] = {
+    {IdEditor, ControlKind::MultiEdit, "", true, true},
+    {IdBrickList, ControlKind::DropList, "", true, true},
+    {IdSourceList, ControlKind::DropList, "", true, true},
+    {IdAutoClear, ControlKind::CheckBox, "Auto Clear", true, true},
+    {IdAutoRun, ControlKind::CheckBox, "Auto Run", true, true},
+    {IdDownloadFileName, ControlKind::Edit, "", true, true},
+    {IdFirmwareFileName, ControlKind::Edit, "", true, true},
+    {IdRangeShort, ControlKind::RadioButton, "Short", true, false},
+    {IdRangeMedium, ControlKind::RadioButton, "Medium", true, false},
+    {IdRangeLong, ControlKind::RadioButton, "Long", true, false},
+    {IdOpenPort, ControlKind::PushButton, "Open", true, true},
+    {IdClosePort, ControlKind::PushButton, "Close", true, true},
+    {IdTest, ControlKind::PushButton, "Test", true, true},
+    {IdValidate, ControlKind::PushButton, "Validate", true, true},
+    {IdExecute, ControlKind::PushButton, "Execute", true, true},
+    {IdDownload, ControlKind::PushButton, "Download", true, true},
+    {IdDownloadFile, ControlKind::PushButton, "Download File", true, true},
+    {IdNewFirmware, ControlKind::PushButton, "New Firmware", true, true},
+    {IdStatistics, ControlKind::PushButton, "Statistics", true, true},
+    {IdInfo, ControlKind::PushButton, "Info", true, true},
+    {IdExecuteAsync, ControlKind::PushButton, "Async", false, true},
+    {IdStress, ControlKind::PushButton, "Stress", false, true},
+    {IdStressCount, ControlKind::Edit, "", false, true},
+    {IdUpload, ControlKind::PushButton, "Upload", false, true},
+    {IdReceive, ControlKind::CheckBox, "Receive", false, true},
+    {IdStatusBox, ControlKind::MultiEdit, "", true, true},
+};
+
+std::string Repeat(char c, std::size_t n)
+{
+    return std::string(n, c);
+}
+
+} // namespace
+
+TEST(DialogTemplate, DescribesDialog101WithMenu202)
+{
+    const DialogTemplate& layout = TestClientDialogTemplate();
+    EXPECT_EQ(layout.resourceId, 101);
+    EXPECT_STREQ(layout.caption, "Tessel Test Client");
+    EXPECT_STREQ(layout.fontName, "MS Sans Serif");
+    EXPECT_EQ(layout.fontPoints, 8);
+    EXPECT_EQ(layout.width, 372);
+    EXPECT_EQ(layout.height, 289);
+    EXPECT_EQ(layout.menuId, 202);
+
+    std::set<int> ids;
+    for (int i = 0; i < layout.controlCount; ++i) {
+        const ControlSpec& spec = layout.controls[i];
+        if (spec.id == kNoControlId)
+            continue;
+        EXPECT_TRUE(ids.insert(spec.id).second) << "control id " << spec.id << " twice";
+        EXPECT_GE(spec.x, 0);
+        EXPECT_LE(spec.x + spec.width, layout.width) << "control " << spec.id;
+        EXPECT_LE(spec.y + spec.height, layout.height) << "control " << spec.id;
+    }
+    EXPECT_EQ(ids.size(), std::size(kExpectedControls));
+    const ControlSpec* status = layout.Find(IdStatusBox);
+    ASSERT_NE(status, nullptr);
+    EXPECT_TRUE(status->style & StyleReadOnly);
+    EXPECT_TRUE(status->style & StyleVScroll);
+    const ControlSpec* editor = layout.Find(IdEditor);
+    ASSERT_NE(editor, nullptr);
+    EXPECT_TRUE((editor->style & StyleHScroll) && (editor->style & StyleVScroll));
+
+    int labels = 0;
+    int groups = 0;
+    for (int i = 0; i < layout.controlCount; ++i) {
+        const ControlSpec& spec = layout.controls[i];
+        if (spec.kind == ControlKind::Label) {
+            ++labels;
+            EXPECT_TRUE(std::strcmp(spec.caption, "Brick:") == 0 ||
+                        std::strcmp(spec.caption, "Source:") == 0);
+        }
+        if (spec.kind == ControlKind::GroupBox) {
+            ++groups;
+            EXPECT_TRUE(std::strcmp(spec.caption, "Range") == 0 ||
+                        std::strcmp(spec.caption, "Download") == 0);
+        }
+    }
+    EXPECT_EQ(labels, 2);
+    EXPECT_EQ(groups, 2);
+}
+
+TEST(DialogTemplate, MenuItemsCarryTheirCommandIds)
+{
+    const DialogTemplate& layout = TestClientDialogTemplate();
+    struct Item {
+        const char* menu;
+        const char* caption;
+        int id;
+        bool greyed;
+    };
+    const Item expected[] = {
+        {"&File", "&New", 32768, false},
+        {"&File", "&Open...", 32774, false},
+        {"&File", "&Save", 32769, false},
+        {"&File", "Save &As...", 32770, false},
+        {"&File", nullptr, 0, false},
+        {"&File", "E&xit", 32771, false},
+        {"&Port", "&Open", 205, false},
+        {"&Port", "&Test", 204, false},
+        {"&Port", "&Statistics", 206, false},
+        {"&Port", "&Close", 215, false},
+        {"&Script", "&Validate", 202, false},
+        {"&Script", "&Execute", 203, false},
+        {"&Script", "Execute &Async", 217, false},
+        {"&Script", "&Download", 201, false},
+        {"S&pecial", "&Info", 216, false},
+        {"S&pecial", "&Upload", 221, false},
+        {"S&pecial", "&Stress", 212, false},
+        {"S&pecial", "Download &Firmware", 207, false},
+        {"S&pecial", "&Convert to CSV", 32775, true},
+        {"S&pecial", "&Macro To CSV", 32777, false},
+        {"&Help", "About", 32773, false},
+    };
+    std::size_t next = 0;
+    for (int m = 0; m < layout.menuCount; ++m) {
+        for (int i = 0; i < layout.menus[m].itemCount; ++i, ++next) {
+            ASSERT_LT(next, std::size(expected));
+            const MenuItemSpec& item = layout.menus[m].items[i];
+            SCOPED_TRACE(std::string(layout.menus[m].caption) + " item " + std::to_string(i));
+            EXPECT_STREQ(layout.menus[m].caption, expected[next].menu);
+            if (expected[next].caption == nullptr) {
+                EXPECT_EQ(item.caption, nullptr);
+            } else {
+                EXPECT_STREQ(item.caption, expected[next].caption);
+            }
+            EXPECT_EQ(item.id, expected[next].id);
+            EXPECT_EQ(item.greyed, expected[next].greyed);
+        }
+    }
+    EXPECT_EQ(next, std::size(expected));
+}
+
+TEST_F(FrameFixture, ControlsStartAsTheTableSays)
+{
+    Start("[FIRMWARE]\nSOURCE=fw0309.lgo\n[OPTIONS]\nAUTOCLEAR=true\nAUTORUN=FALSE\n");
+    for (const ControlExpectation& c : kExpectedControls) {
+        SCOPED_TRACE("control " + std::to_string(c.id));
+        EXPECT_EQ(host().IsControlVisible(window(), c.id), c.visible);
+        EXPECT_EQ(host().IsControlEnabled(window(), c.id), c.enabled);
+        if (c.kind == ControlKind::PushButton || c.kind == ControlKind::CheckBox ||
+            c.kind == ControlKind::RadioButton) {
+            EXPECT_EQ(host().ControlText(window(), c.id), c.caption);
+        }
+    }
+    ASSERT_EQ(host().ListCount(window(), IdBrickList), 2);
+    EXPECT_EQ(host().ListEntry(window(), IdBrickList, 0), "Rover");
+    EXPECT_EQ(host().ListEntry(window(), IdBrickList, 1), "Onyx2");
+    EXPECT_EQ(host().ListSelection(window(), IdBrickList), 1);
+    ASSERT_EQ(host().ListCount(window(), IdSourceList), 4);
+    EXPECT_EQ(host().ListEntry(window(), IdSourceList, 0), "Script");
+    EXPECT_EQ(host().ListEntry(window(), IdSourceList, 1), "Opal");
+    EXPECT_EQ(host().ListEntry(window(), IdSourceList, 2), "RAW");
+    EXPECT_EQ(host().ListEntry(window(), IdSourceList, 3), "BIN");
+    EXPECT_EQ(host().ListSelection(window(), IdSourceList), 0);
+    EXPECT_TRUE(host().IsChecked(window(), IdAutoClear));
+    EXPECT_FALSE(host().IsChecked(window(), IdAutoRun));
+    EXPECT_EQ(host().ControlText(window(), IdStressCount), "100");
+    EXPECT_EQ(host().ControlText(window(), IdFirmwareFileName), "fw0309.lgo");
+    EXPECT_EQ(host().WindowTitle(window()), "Tessel Test Client");
+    EXPECT_TRUE(host().WindowVisible(window()));
+}
+
+TEST_F(FrameFixture, SettingsReachTheMembers)
+{
+    Construct("[PATHS]\nFIRMWARE=/fw/\n[FIRMWARE]\nSOURCE=a.lgo\n[PORTS]\nUSB=U1\nSerial=S1\n"
+              "[OPTIONS]\nAUTORUN=True\nAUTOCLEAR=yes\nAUTODOWNLOAD=TRUE\n"
+              "[DEBUG]\nLOGFILE=/tmp/x.log\n");
+    EXPECT_STREQ(dialog().firmwareDir(), "/fw/");
+    EXPECT_STREQ(dialog().firmwareFile(), "a.lgo");
+    EXPECT_STREQ(dialog().usbPort(), "U1");
+    EXPECT_STREQ(dialog().serialPort(), "S1");
+    EXPECT_TRUE(dialog().autoRun());
+    EXPECT_FALSE(dialog().autoClear());
+    EXPECT_TRUE(dialog().autoDownload());
+    EXPECT_STREQ(dialog().logFile(), "/tmp/x.log");
+    EXPECT_NE(dialog().session(), nullptr);
+    EXPECT_EQ(dialog().brickHandle(), 0);
+    EXPECT_EQ(dialog().handle(), kNoWindow);
+}
+
+TEST_F(FrameFixture, NoPortsOpensNothingAndShowsNothing)
+{
+    Start("");
+    EXPECT_EQ(dialog().brickHandle(), 0);
+    EXPECT_TRUE(EventsOf(Kind::Status).empty());
+    EXPECT_TRUE(EventsOf(Kind::Question).empty());
+}
+
+TEST_F(FrameFixture, UsbPortWinsOverSerial)
+{
+    Start("[PORTS]\nUSB=KIVOTOWER1\nSerial=COM1\n");
+    EXPECT_NE(dialog().brickHandle(), 0);
+    EXPECT_EQ(dialog().portType(), tessel::PortUsb);
+}
+
+TEST_F(FrameFixture, SerialPortIsTriedWhenUsbGivesNoHandle)
+{
+    Start("[PORTS]\nUSB=KIVOTOWER7\nSerial=COM1\n");
+    EXPECT_NE(dialog().brickHandle(), 0);
+    EXPECT_EQ(dialog().portType(), tessel::PortSerialIr);
+}
+
+TEST_F(FrameFixture, MissingStartupFileIsForgotten)
+{
+    const std::string missing = (scratch().path() / "gone.onyx2").string();
+    Start("[PORTS]\nUSB=KIVOTOWER1\n[OPTIONS]\nAUTODOWNLOAD=TRUE\n", missing);
+    EXPECT_STREQ(dialog().currentFile(), "");
+    EXPECT_EQ(host().ControlText(window(), IdEditor), "");
+    EXPECT_EQ(host().WindowTitle(window()), "Tessel Test Client");
+    EXPECT_TRUE(EventsOf(Kind::Title).empty());
+    EXPECT_EQ(dialog().operationsInFlight(), 0);
+    for (const auto& status : EventsOf(Kind::Status)) {
+        EXPECT_EQ(status.text.find("Download"), std::string::npos) << status.text;
+    }
+}
+
+TEST_F(FrameFixture, StartupFileIsLoadedWithItsBytesAndTitled)
+{
+    const std::string bytes = "task main\r\n{\r\n  sound 4\r\n}\r\n";
+    const std::string file = scratch().Write("robot.onyx2", bytes);
+    Start("", file);
+    EXPECT_STREQ(dialog().currentFile(), file.c_str());
+    EXPECT_EQ(host().ControlText(window(), IdEditor), bytes);
+    EXPECT_EQ(host().WindowTitle(window()), "Tessel Test Client - robot.onyx2");
+}
+
+TEST_F(FrameFixture, TitleShowsThePartAfterTheLastSlashOrBackslash)
+{
+    // On Linux a backslash may stand in a file name; the title still cuts there.
+    const std::string file = scratch().Write("C:\\work\\robot.onyx2", "x");
+    Start("", file);
+    EXPECT_EQ(host().WindowTitle(window()), "Tessel Test Client - robot.onyx2");
+}
+
+TEST_F(FrameFixture, TitleOfAnEmptyFileNameEndsInTheSeparator)
+{
+    Start("");
+    dialog().UpdateTitle();
+    EXPECT_EQ(host().WindowTitle(window()), "Tessel Test Client - ");
+}
+
+TEST_F(FrameFixture, TitleOfABareNameShowsTheWholeName)
+{
+    // The command line's file may be relative; load it from the scratch directory.
+    const std::string file = scratch().Write("bare.onyx2", "x");
+    const auto old = std::filesystem::current_path();
+    std::filesystem::current_path(scratch().path());
+    Start("", "bare.onyx2");
+    std::filesystem::current_path(old);
+    EXPECT_EQ(host().WindowTitle(window()), "Tessel Test Client - bare.onyx2");
+}
+
+TEST_F(FrameFixture, ReadEditorTextReturnsTheWholeText)
+{
+    Start("");
+    for (std::size_t length : {0u, 1u, 1022u, 1023u, 1024u, 1025u, 2047u, 5000u, 1u << 20}) {
+        SCOPED_TRACE(length);
+        std::string text = Repeat('a', length);
+        if (length > 2)
+            text[length / 2] = '\n';
+        host().SetControlText(window(), IdEditor, text.c_str());
+        std::unique_ptr<char[]> read = dialog().ReadEditorText();
+        ASSERT_NE(read, nullptr);
+        EXPECT_EQ(std::strlen(read.get()), length);
+        EXPECT_TRUE(text == read.get());
+    }
+}
+
+TEST_F(FrameFixture, SelectedTypesFollowTheLists)
+{
+    Start("");
+    EXPECT_EQ(dialog().SelectedBrickType(), 6);
+    host().ListSelect(window(), IdBrickList, 0);
+    EXPECT_EQ(dialog().SelectedBrickType(), 5);
+    host().ListSelect(window(), IdBrickList, -1);
+    EXPECT_EQ(dialog().SelectedBrickType(), 6);
+
+    const std::int32_t expected[] = {1, 2, 3, 4};
+    for (int i = 0; i < 4; ++i) {
+        host().ListSelect(window(), IdSourceList, i);
+        EXPECT_EQ(dialog().SelectedSourceType(), expected[i]);
+    }
+    host().ListSelect(window(), IdSourceList, -1);
+    EXPECT_EQ(dialog().SelectedSourceType(), 1);
+}
+
+TEST_F(FrameFixture, LoadScriptFileRefusesWhatCannotBeRead)
+{
+    Start("");
+    host().SetControlText(window(), IdEditor, "kept");
+    EXPECT_FALSE(dialog().LoadScriptFile((scratch().path() / "none").string().c_str()));
+    EXPECT_FALSE(dialog().LoadScriptFile(scratch().path().string().c_str()));
+    EXPECT_FALSE(dialog().LoadScriptFile(""));
+    EXPECT_EQ(host().ControlText(window(), IdEditor), "kept");
+
+    const std::string empty = scratch().Write("empty.onyx2", "");
+    EXPECT_TRUE(dialog().LoadScriptFile(empty.c_str()));
+    EXPECT_EQ(host().ControlText(window(), IdEditor), "");
+    EXPECT_STREQ(dialog().currentFile(), "");
+}
+
+TEST_F(FrameFixture, CustomMessagesWithoutHandlerChangeNothing)
+{
+    Start("[PORTS]\nUSB=KIVOTOWER1\n");
+    host().SetControlText(window(), IdEditor, "text");
+    ClearEvents();
+    const tessel::Long handle = dialog().brickHandle();
+    for (Message m : {kMsgUser + 0, kMsgUser + 5, kMsgUser + 6, kMsgUser + 7, kMsgUser + 8,
+                      kMsgUser + 9, kMsgUser + 10}) {
+        ASSERT_TRUE(host().PostMessage(window(), m, 0xFFFFFFFFu, -1));
+    }
+    EXPECT_EQ(host().DispatchPending(), 7);
+    EXPECT_TRUE(EventsOf(Kind::Status).empty());
+    EXPECT_TRUE(EventsOf(Kind::Title).empty());
+    EXPECT_TRUE(EventsOf(Kind::Question).empty());
+    EXPECT_EQ(host().ControlText(window(), IdEditor), "text");
+    EXPECT_EQ(dialog().brickHandle(), handle);
+    EXPECT_EQ(dialog().stressIteration(), 0);
+    EXPECT_EQ(dialog().operationsInFlight(), 0);
+}
+
+TEST_F(FrameFixture, UnroutedCommandsAreLeftToTheHost)
+{
+    Start("");
+    for (int id : std::initializer_list<int>{
+             0, 1, 3, IdEditor, IdStatusBox, IdBrickList, IdSourceList, IdAutoClear, IdAutoRun,
+             IdDownloadFileName, IdFirmwareFileName, IdStressCount, 32772, 32776, 32778}) {
+        EXPECT_FALSE(dialog().RouteCommand(id)) << id;
+    }
+    EXPECT_TRUE(host().WindowExists(window()));
+}
+
+TEST_F(FrameFixture, EveryCommandIdReachesAHandlerWithoutAPort)
+{
+    Start("");
+    for (int id : {32768, 32774, 32769, 32770, 32773, 205, 215, 204, 206, 218, 219,   220,
+                   202,   203,   217,   201,   211,   224, 207, 216, 221, 212, 32775, 32777}) {
+        EXPECT_TRUE(dialog().RouteCommand(id)) << id;
+        host().DispatchPending();
+    }
+    EXPECT_TRUE(host().WindowExists(window()));
+    EXPECT_FALSE(host().QuitRequested());
+}
+
+TEST_F(FrameFixture, CommandsAreRoutedByIdWhateverTheNotificationCode)
+{
+    Start("");
+    host().SendMessage(window(), kMsgCommand, MakeCommand(IdAbout, 0x0300), 0);
+    EXPECT_EQ(EventsOf(Kind::MessageBox).size(), 1u);
+}
+
+TEST_F(FrameFixture, CancelDestroysTheWindowAndPostsQuitZero)
+{
+    Start("[PORTS]\nUSB=KIVOTOWER1\n");
+    const WindowHandle w = window();
+    host().SendMessage(w, kMsgCommand, MakeCommand(kIdCancel), 0);
+    EXPECT_FALSE(host().WindowExists(w));
+    EXPECT_EQ(dialog().handle(), kNoWindow);
+    EXPECT_TRUE(host().QuitRequested());
+    EXPECT_EQ(host().ExitCode(), 0);
+    EXPECT_EQ(dialog().session(), nullptr);
+    EXPECT_EQ(dialog().brickHandle(), 0);
+    // The nested pump sees the request and leaves it for the outer loop.
+    EXPECT_FALSE(host().PumpMessage());
+    EXPECT_EQ(host().RunMessageLoop(), 0);
+}
+
+TEST_F(FrameFixture, ExitReleasesAResultFileStillQueued)
+{
+    Start("");
+    ReaderWriter* file = nullptr;
+    ASSERT_NE(dialog().session(), nullptr);
+    DirEnt* entry = dialog().session()->resultEntry();
+    ASSERT_NE(entry, nullptr);
+    file = entry->open(tessel::FileResult);
+    ASSERT_NE(file, nullptr);
+    ASSERT_TRUE(host().PostMessage(window(), kMsgExecResult, 0, reinterpret_cast<LParam>(file)));
+    host().SendMessage(window(), kMsgCommand, MakeCommand(IdFileExit), 0);
+    // TearDown counts the live workspace objects: the file must be gone.
+}
+
+TEST_F(FrameFixture, StressMessageCountsTheIteration)
+{
+    Start("");
+    ASSERT_TRUE(host().PostMessage(window(), kMsgStressNext, 0, 0));
+    host().DispatchPending();
+    // An empty editor stops the step, keeping the count.
+    EXPECT_EQ(dialog().stressIteration(), 1);
+}
+
+namespace {
+
+// The recording library, opened by the absolute path the session uses too.
+class RecordingFrame : public FrameFixture {
+protected:
+    void SetUp() override
+    {
+        if (headless_test::RecordingLibraryDirectory().empty())
+            GTEST_SKIP() << "no testlib";
+        library_ = std::make_unique<testsupport::RecordingLibrary>(
+            headless_test::RecordingLibraryDirectory() + "/");
+        ASSERT_TRUE(library_->loaded());
+    }
+    void TearDown() override
+    {
+        FrameFixture::TearDown();
+        library_.reset();
+    }
+    RecordingState& state() { return library_->state(); }
+
+    std::unique_ptr<testsupport::RecordingLibrary> library_;
+};
+
+} // namespace
+
+TEST_F(RecordingFrame, TeardownSwitchesReceptionOffBeforeDestroyingTheHandle)
+{
+    state().results[tessel::SlotCreate] = 77;
+    Start("[PORTS]\nUSB=T1\n", "", headless_test::RecordingLibraryDirectory());
+    ASSERT_EQ(dialog().brickHandle(), 77);
+    host().SetCheck(window(), IdReceive, true);
+    host().SendMessage(window(), kMsgCommand, MakeCommand(IdReceive), 0);
+    ASSERT_TRUE(dialog().receiving());
+    ASSERT_EQ(state().calls[tessel::SlotExec].count, 1);
+    EXPECT_NE(state().calls[tessel::SlotExec].pointers[3], nullptr); // the callback
+
+    host().SendMessage(window(), kMsgCommand, MakeCommand(IdFileExit), 0);
+    EXPECT_EQ(state().calls[tessel::SlotExec].count, 2);
+    EXPECT_EQ(state().calls[tessel::SlotExec].numbers[0], 77);
+    for (const void* pointer : state().calls[tessel::SlotExec].pointers) {
+        EXPECT_EQ(pointer, nullptr);
+    }
+    EXPECT_EQ(state().calls[tessel::SlotDestroy].count, 1);
+    EXPECT_EQ(state().calls[tessel::SlotDestroy].numbers[0], 77);
+    EXPECT_EQ(state().calls[tessel::SlotTerminate].count, 1);
+}
+
+TEST_F(RecordingFrame, TeardownWithoutReceptionOnlyDestroys)
+{
+    state().results[tessel::SlotCreate] = 5;
+    Start("[PORTS]\nSerial=S1\n", "", headless_test::RecordingLibraryDirectory());
+    ASSERT_EQ(dialog().brickHandle(), 5);
+    ASSERT_EQ(state().calls[tessel::SlotCreate].count, 1);
+    host().SendMessage(window(), kMsgCommand, MakeCommand(IdFileExit), 0);
+    EXPECT_EQ(state().calls[tessel::SlotExec].count, 0);
+    EXPECT_EQ(state().calls[tessel::SlotDestroy].count, 1);
+}
