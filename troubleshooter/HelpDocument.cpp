@@ -50,8 +50,8 @@ void AppendEntity(const std::string& entity, std::string& out)
     static constexpr struct {
         const char* name;
         const char* text;
-    } kEntities[] = {{"amp", "&"},   {"lt", "<"},   {"gt", ">"},
-                     {"quot", "\""}, {"nbsp", " "}, {"apos", "'"}};
+    } kEntities[] = {{"amp", "&"},  {"lt", "<"},   {"gt", ">"},    {"quot", "\""},
+                     {"nbsp", " "}, {"apos", "'"}, {"middot", "-"}};
     for (const auto& known : kEntities) {
         if (entity == known.name) {
             out += known.text;
@@ -208,7 +208,7 @@ std::vector<std::string> HelpDocument::TopicText(const std::string& id) const
         }
         if (c == '&') {
             const std::size_t semi = html.find(';', i);
-            if (semi != std::string::npos && semi - i <= 6) {
+            if (semi != std::string::npos && semi - i <= 8) {
                 AppendEntity(html.substr(i + 1, semi - i - 1), line);
                 i = semi;
                 continue;
