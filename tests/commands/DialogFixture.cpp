@@ -82,11 +82,10 @@ void DialogFixture::Start(const std::string& scenario, const std::string& ports,
     ASSERT_TRUE(dialog_->Create());
 }
 
-void DialogFixture::Stop()
+void DialogFixture::Stop(bool settle)
 {
     if (dialog_) {
-        // Reports still on their way are handled first, as the running program would.
-        if (dialog_->handle() != ui::kNoWindow)
+        if (settle && dialog_->handle() != ui::kNoWindow)
             Settle();
         dialog_.reset();
     }

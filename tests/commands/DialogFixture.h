@@ -35,8 +35,9 @@ protected:
     // creates the dialog. fileArgument is the command line's file, "" for none.
     void Start(const std::string& scenario, const std::string& ports = "",
                const std::string& options = "", const std::string& fileArgument = "");
-    // Destroys the dialog (and with it the session); the library is terminated.
-    void Stop();
+    // Destroys the dialog (and with it the session); the library is terminated. With settle,
+    // reports on their way are handled first, as the running program would.
+    void Stop(bool settle = true);
 
     ui::TestClientDialog& dialog() { return *dialog_; }
     ui::HeadlessHost& host() { return *host_; }

@@ -1,0 +1,292 @@
+// Validate, Execute, Execute Async, Download, Download File, Receive and the reports that the
+// library's callbacks post, against the simulated library.
+//
+// Where a test is about the dialog rather than the language, the editor holds object text
+// with the Source list on BIN, which the library takes as code without translating it.
+#include <string>
+
+#include "DialogFixture.h"
+#include "errors/ErrorText.h"
+#include "session/BrickSession.h"
+
+namespace commands_test {
+namespace {
+
+using ui::HeadlessEvent;
+
+constexpr const char* kVersionRequest = "tobj 1 6 immediate\ncmd 32\n";
+constexpr const char* kVersionAnswer = "0x00,0x03,0x00,0x01,0x00,0x03,0x00,0x09";
+constexpr const char* kSoundRequest = "tobj 1 6 immediate\ncmd 20 04\n";
+
+class ScriptCommands : public DialogFixture {
+protected:
+    // The default installation with its serial tower opened at start-up.
+    void StartOpen(const std::string& extraPortLines = "", const std::string& options = "")
+    {
+        ASSERT_NO_FATAL_FAILURE(
+            Start(std::string(kFastLink) + "[brick b1]\n" + "[port COM1]\n" + extraPortLines,
+                  "Serial=COM1", options));
+        ASSERT_NE(dialog().brickHandle(), 0);
+        ClearEvents();
+    }
+    void EditBinary(const std::string& objectText)
+    {
+        SetText(ui::IdEditor, objectText);
+        SelectSource(ui::SourceListBin);
+    }
+    void SetBlockSize(std::int16_t bytes)
+    {
+        ASSERT_GE(
+            dialog().session()->Set(dialog().brickHandle(), tessel::PropDownloadBlockSize, bytes),
+            0);
+    }
+};
+
+bool IsReceived(const std::string& text)
+{
+    return text.rfind("Received PBMessage: ", 0) == 0;
+}
+
+TEST_F(ScriptCommands, EveryBrickCommandWithoutAPortSaysPortNotOpen)
+{
+    ASSERT_NO_FATAL_FAILURE(Start(std::string(kFastLink) + "[brick b1]\n[port COM1]\n"));
+    EditBinary(kSoundRequest);
+    for (int id : {ui::IdExecute, ui::IdExecuteAsync, ui::IdDownload, ui::IdDownloadFile}) {
+        ClearEvents();
+        Click(id);
+        EXPECT_EQ(Statuses(), std::vector<std::string>{"Port not open"}) << "command " << id;
+    }
+    EXPECT_TRUE(Offers().empty());
+}
+
+TEST_F(ScriptCommands, ValidateRefusesOpalSource)
+{
+    ASSERT_NO_FATAL_FAILURE(StartOpen());
+    SetText(ui::IdEditor, "anything");
+    SelectSource(ui::SourceListOpal);
+    Click(ui::IdValidate);
+    EXPECT_EQ(Statuses(), std::vector<std::string>{"Cannot validate Opal source (yet?)"});
+}
+
+TEST_F(ScriptCommands, AnEmptyEditorOnlyClearsTheStatusBox)
+{
+    ASSERT_NO_FATAL_FAILURE(StartOpen());
+    SetText(ui::IdEditor, "");
+    for (int id : {ui::IdValidate, ui::IdExecute, ui::IdExecuteAsync, ui::IdDownload}) {
+        ClearEvents();
+        Click(id);
+        Settle();
+        EXPECT_EQ(Statuses(), std::vector<std::string>{""}) << "command " << id;
+    }
+}
+
+TEST_F(ScriptCommands, ExecuteShowsTheResultNumberAndText)
+{
+    ASSERT_NO_FATAL_FAILURE(StartOpen());
+    EditBinary(kVersionRequest);
+    Click(ui::IdExecute);
+    EXPECT_EQ(Statuses(), (std::vector<std::string>{"", std::string("Exec result: 0 (") +
+                                                            kVersionAnswer + ")"}));
+    EXPECT_EQ(host().FocusedControl(window()), ui::IdEditor);
+}
+
+TEST_F(ScriptCommands, ExecuteWithoutAnAnswerSaysExecOk)
+{
+    ASSERT_NO_FATAL_FAILURE(StartOpen());
+    EditBinary(kSoundRequest);
+    Click(ui::IdExecute);
+    EXPECT_EQ(LastStatus(), "Exec ok");
+}
+
+TEST_F(ScriptCommands, AFailedExecutionIsShownAndOffersHelp)
+{
+    ASSERT_NO_FATAL_FAILURE(StartOpen("loss = 100\n"));
+    EditBinary(kSoundRequest);
+    Click(ui::IdExecute);
+    EXPECT_EQ(LastStatus(), "Error (0xe1000204) from Wisp: Retry count exceeded");
+    EXPECT_EQ(Offers(), std::vector<std::string>{
+                            "Error (0xe1000204) from Wisp: Retry count exceeded.\r\nUse Trouble "
+                            "Shooter?"});
+}
+
+TEST_F(ScriptCommands, ExecuteAsyncShowsTheResultWhenItArrives)
+{
+    ASSERT_NO_FATAL_FAILURE(StartOpen());
+    EditBinary(kVersionRequest);
+    Click(ui::IdExecuteAsync);
+    Settle();
+    EXPECT_EQ(Statuses(),
+              (std::vector<std::string>{"", std::string("Exec result: ") + kVersionAnswer}));
+}
+
+TEST_F(ScriptCommands, ExecuteAsyncWithoutAnAnswerSaysExecOk)
+{
+    ASSERT_NO_FATAL_FAILURE(StartOpen());
+    EditBinary(kSoundRequest);
+    Click(ui::IdExecuteAsync);
+    Settle();
+    EXPECT_EQ(Statuses(), (std::vector<std::string>{"", "Exec ok"}));
+}
+
+TEST_F(ScriptCommands, AnAsyncFailureReportedLaterIsShownAndOffersHelp)
+{
+    ASSERT_NO_FATAL_FAILURE(StartOpen("loss = 100\n"));
+    EditBinary(kSoundRequest);
+    Click(ui::IdExecuteAsync);
+    EXPECT_TRUE(Offers().empty()); // the call itself went through
+    Settle();
+    EXPECT_EQ(LastStatus(), "Error (0xe1000204) from Wisp: Retry count exceeded");
+    EXPECT_EQ(Offers().size(), 1u);
+}
+
+TEST_F(ScriptCommands, AnAsyncResultArrivingAfterTheWindowClosedIsReleased)
+{
+    ASSERT_NO_FATAL_FAILURE(StartOpen());
+    EditBinary(kVersionRequest);
+    Click(ui::IdExecuteAsync);
+    // The result file is on its way or queued; the fixture counts live workspace objects
+    // after the session is gone.
+    Stop(false);
+}
+
+TEST_F(ScriptCommands, DownloadProgressIsShownInOrderAndEndsWithTheElapsedTime)
+{
+    ASSERT_NO_FATAL_FAILURE(StartOpen());
+    EditBinary(SoundProgram(40));
+    ASSERT_NO_FATAL_FAILURE(SetBlockSize(32)); // sixteen 2-byte commands a block
+    Click(ui::IdDownload);
+    Settle();
+    EXPECT_EQ(Statuses(),
+              (std::vector<std::string>{"", "Downloading", "Downloading: 40% done",
+                                        "Downloading: 80% done", "Downloaded ok (0 mS)"}));
+    EXPECT_EQ(dialog().downloadTotal(), 40);
+    EXPECT_EQ(host().FocusedControl(window()), ui::IdEditor);
+}
+
+TEST_F(ScriptCommands, TenOfFortyCommandsShowTwentyFivePercent)
+{
+    ASSERT_NO_FATAL_FAILURE(StartOpen());
+    EditBinary(SoundProgram(40));
+    ASSERT_NO_FATAL_FAILURE(SetBlockSize(20));
+    Click(ui::IdDownload);
+    Settle();
+    EXPECT_EQ(Statuses(), (std::vector<std::string>{
+                              "", "Downloading", "Downloading: 25% done", "Downloading: 50% done",
+                              "Downloading: 75% done", "Downloaded ok (0 mS)"}));
+}
+
+TEST_F(ScriptCommands, AnObjectWithoutCommandsSaysNoCodeAndSendsNothing)
+{
+    ASSERT_NO_FATAL_FAILURE(StartOpen());
+    EditBinary("tobj 1 6 program\n");
+    Click(ui::IdDownload);
+    Settle();
+    EXPECT_EQ(Statuses(), (std::vector<std::string>{"", "No code"}));
+    EXPECT_EQ(dialog().operationsInFlight(), 0);
+    EXPECT_TRUE(Offers().empty());
+}
+
+TEST_F(ScriptCommands, ADownloadRefusedByTheLibraryIsShownAndOffersHelp)
+{
+    ASSERT_NO_FATAL_FAILURE(StartOpen());
+    // Code for a Rover sent to an Onyx2.
+    EditBinary(SoundProgram(4, 5));
+    Click(ui::IdDownload);
+    Settle();
+    EXPECT_EQ(Statuses(), (std::vector<std::string>{
+                              "", "Downloading",
+                              "Error (0xe0050403) from Tessel driver: PBrick type mismatch"}));
+    EXPECT_EQ(Offers(),
+              std::vector<std::string>{"Error (0xe0050403) from Tessel driver: PBrick type "
+                                       "mismatch.\r\nUse Trouble Shooter?"});
+}
+
+TEST_F(ScriptCommands, ADownloadThatBreaksOffReportsTheErrorOfTheCallback)
+{
+    ASSERT_NO_FATAL_FAILURE(
+        Start(std::string(kFastLink) + "[brick b1]\n[port KIVOTOWER1]\nunplug-after = 12\n",
+              "USB=KIVOTOWER1"));
+    ASSERT_NE(dialog().brickHandle(), 0);
+    EditBinary(SoundProgram(40));
+    ASSERT_NO_FATAL_FAILURE(SetBlockSize(2)); // one command, one packet
+    ClearEvents();
+    Click(ui::IdDownload);
+    Settle();
+
+    const std::string unplugged =
+        "Error (0xe0050474) from Tessel driver: Kivo USB Tower has been unplugged from this port";
+    const std::vector<std::string> shown = Statuses();
+    ASSERT_GE(shown.size(), 4u);
+    EXPECT_EQ(shown[2].rfind("Downloading: ", 0), 0u) << shown[2];
+    EXPECT_EQ(shown.back(), unplugged);
+    EXPECT_EQ(Offers(), std::vector<std::string>{unplugged + ".\r\nUse Trouble Shooter?"});
+}
+
+TEST_F(ScriptCommands, DownloadFileOfAMissingFileShowsTheErrorAndLeavesTheCaret)
+{
+    ASSERT_NO_FATAL_FAILURE(StartOpen());
+    SetText(ui::IdEditor, "some text in the editor");
+    host().SetEditSelection(window(), ui::IdEditor, 5, 5);
+    SetText(ui::IdDownloadFileName, (dir() / "missing.onyx2").string());
+    Click(ui::IdDownloadFile);
+    Settle();
+
+    const std::vector<std::string> shown = Statuses();
+    ASSERT_EQ(shown.size(), 1u); // the status box is not cleared first
+    EXPECT_EQ(shown[0].rfind("Error (0x", 0), 0u) << shown[0];
+    EXPECT_EQ(Offers().size(), 1u);
+    std::int32_t start = -1, end = -1;
+    host().GetEditSelection(window(), ui::IdEditor, &start, &end);
+    EXPECT_EQ(start, 5);
+    EXPECT_EQ(end, 5);
+}
+
+TEST_F(ScriptCommands, ReceptionShowsEachMessageInTurnUntilSwitchedOff)
+{
+    ASSERT_NO_FATAL_FAILURE(Start(
+        std::string(kFastLink) + "[brick b1]\nmessages = 3, 7, 9\n[port COM1]\n", "Serial=COM1"));
+    ClearEvents();
+    ASSERT_FALSE(host().IsControlVisible(window(), ui::IdReceive)); // hidden, but clickable
+    Click(ui::IdReceive);
+    EXPECT_TRUE(dialog().receiving());
+    WaitForStatuses(3, IsReceived);
+
+    EXPECT_EQ(Statuses(),
+              (std::vector<std::string>{"Received PBMessage: 3", "Received PBMessage: 7",
+                                        "Received PBMessage: 9"}));
+    EXPECT_EQ(EventsOf(HeadlessEvent::Kind::Beep).size(), 3u);
+
+    Click(ui::IdReceive);
+    EXPECT_FALSE(dialog().receiving());
+    EXPECT_FALSE(host().IsChecked(window(), ui::IdReceive));
+}
+
+TEST_F(ScriptCommands, ABadMessageShowsItsErrorWithoutABeep)
+{
+    ASSERT_NO_FATAL_FAILURE(StartOpen());
+    host().PostMessage(window(), ui::kMsgBrickMessage, static_cast<ui::WParam>(0xE0050402u), 4);
+    Settle();
+    EXPECT_EQ(Statuses(), std::vector<std::string>{"Received bad PBMessage, error: 0xe0050402"});
+    EXPECT_TRUE(EventsOf(HeadlessEvent::Kind::Beep).empty());
+    EXPECT_TRUE(Offers().empty());
+}
+
+TEST_F(ScriptCommands, ReceiveWithoutAPortLeavesTheBoxUnchecked)
+{
+    ASSERT_NO_FATAL_FAILURE(Start(std::string(kFastLink) + "[brick b1]\n[port COM1]\n"));
+    Click(ui::IdReceive);
+    EXPECT_EQ(LastStatus(), "Port not open");
+    EXPECT_FALSE(dialog().receiving());
+    EXPECT_FALSE(host().IsChecked(window(), ui::IdReceive));
+}
+
+TEST_F(ScriptCommands, ClosingWhileReceivingSwitchesReceptionOff)
+{
+    ASSERT_NO_FATAL_FAILURE(StartOpen());
+    Click(ui::IdReceive);
+    ASSERT_TRUE(dialog().receiving());
+    Stop(false); // the session must come down cleanly with the receiver running
+}
+
+} // namespace
+} // namespace commands_test
