@@ -4,6 +4,7 @@
 
 #include <cstdint>
 #include <cstdlib>
+#include <random>
 #include <string>
 #include <vector>
 
@@ -680,6 +681,86 @@ TEST_F(DirectoryTree, SharedDirectoryMovesToItsOtherParent)
     EXPECT_EQ(shared->parent(), top_->find("B"));
     EXPECT_EQ(PathOf(top_->find("B/Link/file")), "/B/Link/file");
     EXPECT_EQ(top_->find("A"), nullptr);
+}
+
+// Any mix of linking, unlinking, cloning, copying and open handles, on paths with dots and
+// slashes, must still come apart completely once the last holders let go.
+TEST_F(DirectoryTree, RandomOperationsLeaveNothingBehind)
+{
+    std::mt19937 random(7);
+    const char* const parts[] = {"a", "b", "c", ".", "..", "", "a.b"};
+    auto randomPath = [&] {
+        std::string path = random() % 3 == 0 ? "/" : "";
+        const int components = 1 + static_cast<int>(random() % 4);
+        for (int i = 0; i < components; ++i) {
+            path += parts[random() % std::size(parts)];
+            if (i + 1 < components || random() % 4 == 0) {
+                path += random() % 5 == 0 ? "//" : "/";
+            }
+        }
+        return path;
+    };
+    std::vector<ReaderWriter*> handles;
+    std::vector<DirEnt*> held;
+    for (int round = 0; round < 4000; ++round) {
+        const std::string path = randomPath();
+        switch (random() % 8) {
+        case 0:
+            top_->insert(path.c_str(), newFile());
+            break;
+        case 1:
+            top_->insert(path.c_str(), new Directory());
+            break;
+        case 2:
+            if (DirEnt* existing = top_->find(randomPath().c_str())) {
+                top_->insert(path.c_str(), existing);
+            }
+            break;
+        case 3:
+            top_->remove(path.c_str());
+            break;
+        case 4:
+            if (DirEnt* found = top_->find(path.c_str())) {
+                if (ReaderWriter* handle = found->open(1)) {
+                    handle->write("x\n", 2);
+                    handles.push_back(handle);
+                }
+            }
+            break;
+        case 5:
+            if (DirEnt* found = top_->find(path.c_str())) {
+                if (DirEnt* clone = found->clone()) {
+                    top_->insert(randomPath().c_str(), clone);
+                }
+            }
+            break;
+        case 6:
+            if (DirEnt* found = top_->find(path.c_str());
+                found != nullptr && found->isDirectory()) {
+                auto* copy = new Directory();
+                if (top_->insert(randomPath().c_str(), copy) == copy) {
+                    copy->copyFrom(static_cast<Directory*>(found));
+                }
+            }
+            break;
+        default:
+            if (DirEnt* found = top_->find(path.c_str()); found != nullptr && held.size() < 20) {
+                held.push_back(found->addRef());
+            }
+            break;
+        }
+    }
+    // Held entries may include the top itself, so the tree may go only with the last of them.
+    top_->release();
+    top_ = nullptr;
+    for (ReaderWriter* handle : handles) {
+        EXPECT_GE(handle->size(), 0);
+        handle->release();
+    }
+    for (DirEnt* entry : held) {
+        entry->release();
+    }
+    EXPECT_EQ(live(), 0);
 }
 
 } // namespace
