@@ -47,7 +47,8 @@ public:
 
 class MemoryReaderWriter : public ReaderWriter {
 public:
-    // Count 1, position 0; takes one reference of the entry and one of the block.
+    // Count 1, position 0; takes one reference of the entry and one of the block, which must
+    // not be null (the entries open no handle without one).
     MemoryReaderWriter(DirEnt* entry, MemoryBlock* block, std::int32_t type);
     // Releases the block, then (in the base) the entry.
     ~MemoryReaderWriter() override;
