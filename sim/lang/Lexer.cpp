@@ -184,12 +184,18 @@ std::vector<Token> Lexer::run(std::string_view source)
     if (source.size() > limits_.maxSourceBytes) {
         Fail(kSourceRead, 0, "source too large");
     }
+    // Reserving for the densest text ("a+b" is a token a byte) costs address space only: the
+    // pages that are never written are never touched, and the list is never copied to grow.
     std::vector<Token> raw;
-    raw.reserve(source.size() / 3 + 16);
+    raw.reserve(source.size() + 16);
     scan(source, -1, raw);
     std::vector<Token> out;
-    out.reserve(raw.size() + 16);
-    expand(raw.data(), raw.size(), 0, out);
+    if (directives_.empty()) {
+        out = std::move(raw); // no directive, so no macro either: nothing to expand
+    } else {
+        out.reserve(raw.size() + 16);
+        expand(raw.data(), raw.size(), 0, out);
+    }
     Token end;
     end.kind = Tok::End;
     end.offset = static_cast<std::int32_t>(source.size());

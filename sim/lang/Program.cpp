@@ -301,7 +301,18 @@ ParseResult ParseObject(std::string_view text, Program& out)
 
 std::string WriteObject(const Program& program)
 {
+    std::size_t estimate = 64;
+    for (const Routine& routine : program.routines) {
+        estimate += routine.code.size() * 3 + static_cast<std::size_t>(routine.commands) * 5 + 24;
+    }
+    for (const auto& command : program.immediate) {
+        estimate += command.size() * 3 + 5;
+    }
+    for (const FirmwareRecord& record : program.firmware) {
+        estimate += record.data.size() * 3 + 16;
+    }
     std::string text;
+    text.reserve(estimate);
     char line[64];
     static const char* const kKinds[] = {"immediate", "program", "firmware"};
     std::snprintf(line, sizeof line, "tobj 1 %d %s", program.brickType,

@@ -34,8 +34,7 @@ public:
     // False when the file is missing or unreadable (the translation then fails with 146).
     virtual bool readInclude(const std::string& lowerCasedName, std::string& text) = 0;
 
-protected:
-    ~IncludeReader() = default;
+    virtual ~IncludeReader() = default;
 };
 
 // Receives the translation's failure; at most one report per translation.
@@ -45,8 +44,7 @@ public:
     // offending name or text, possibly empty, never null.
     virtual void report(std::int32_t code, std::int32_t offset, const char* detail) = 0;
 
-protected:
-    ~Diagnostics() = default;
+    virtual ~Diagnostics() = default;
 };
 
 struct TranslateRequest {
