@@ -126,6 +126,8 @@ void InfoReport::AddProgram(tessel::Long hBrick, int slot, const BrickMemoryMap&
     BoundedText<64> tasks;
     tasks.append("tasks: ");
     int taskCount = 0;
+    // What the located tasks and subroutines hold, their closing bytes left out.
+    int locatedSize = 0;
     for (tessel::Short task = 1; task <= BrickMemoryMap::kTasksPerSlot; ++task) {
         std::uint16_t start = 0;
         std::uint16_t size = 0;
@@ -134,6 +136,7 @@ void InfoReport::AddProgram(tessel::Long hBrick, int slot, const BrickMemoryMap&
             size > 0) {
             tasks.append("%d, ", task);
             ++taskCount;
+            locatedSize += size;
         }
     }
     if (taskCount > 0) {
@@ -150,6 +153,7 @@ void InfoReport::AddProgram(tessel::Long hBrick, int slot, const BrickMemoryMap&
             size > 1) {
             subs.append("%d, ", sub);
             ++subCount;
+            locatedSize += size - 1;
         }
     }
     if (subCount > 0) {
@@ -157,6 +161,16 @@ void InfoReport::AddProgram(tessel::Long hBrick, int slot, const BrickMemoryMap&
     }
     if (taskCount == 0 && subCount == 0) {
         report_.append("\r\n");
+        return;
+    }
+    // A Rover keeps its program table in memory and answers the map with zeros, so its size
+    // is what was located rather than a difference of map words (which would come out as
+    // -8 bytes).
+    tessel::Short type = 0;
+    char typeName[tessel::kBrickNameSize] = {};
+    if (access_.Get(hBrick, tessel::PropBrickType, &type, typeName, sizeof typeName) >= 0 &&
+        type == tessel::BrickRover) {
+        report_.append("size: %d bytes\r\n", locatedSize);
         return;
     }
     // Something was listed, so the slot was accepted (1 to 5): the subroutine area plus the

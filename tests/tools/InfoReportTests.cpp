@@ -150,3 +150,21 @@ TEST_F(InfoReportTest, EndlessNameListIsCut)
     EXPECT_NE(text.find("COM256\r\n\t\t\t\r\n"), std::string::npos);
     EXPECT_EQ(text.find("COM257"), std::string::npos);
 }
+
+TEST_F(InfoReportTest, RoverSizeIsWhatWasLocated)
+{
+    brick.brickType = tessel::BrickRover;
+    brick.brickName = "Rover";
+    // Task table from cell 0x239, subroutine table from cell 0x233: task 1 of 6, task 3 of 4,
+    // subroutine 2 of 5 with its closing byte.
+    const std::uint16_t taskStarts[] = {0x700, 0x706, 0x706, 0x70A, 0x70A, 0x70A, 0x70A};
+    for (int i = 0; i < 7; ++i)
+        brick.roverCells[static_cast<std::uint16_t>(0x239 + i)] = taskStarts[i];
+    const std::uint16_t subStarts[] = {0x600, 0x601, 0x606, 0x607};
+    for (int i = 0; i < 4; ++i)
+        brick.roverCells[static_cast<std::uint16_t>(0x233 + i)] = subStarts[i];
+    std::string text = Build();
+    EXPECT_NE(text.find("\tProgram slot: 1 tasks: 1, 3, subs: 2, size: 14 bytes\r\n"),
+              std::string::npos)
+        << text;
+}

@@ -1,0 +1,286 @@
+// The brick tools through the dialog on the headless host, against the simulated library
+// (zero link time): Info, Upload, the memory range reads and the firmware download.
+#include <cstring>
+#include <sstream>
+#include <string>
+#include <vector>
+
+#include "commands/DialogFixture.h"
+#include "session/BrickSession.h"
+#include "tools/BrickAccess.h"
+#include "tools/BrickQueries.h"
+#include "tools/FileText.h"
+
+#ifndef HARBOR_FIRMWARE_DIR
+#define HARBOR_FIRMWARE_DIR ""
+#endif
+
+namespace tools_test {
+namespace {
+
+using commands_test::DialogFixture;
+using commands_test::kFastLink;
+
+// One sound command: 2 bytes of code.
+constexpr const char* kSound = "cmd 20 04\n";
+// Return from a subroutine: 1 byte.
+constexpr const char* kReturn = "cmd 13\n";
+
+std::string Repeat(const char* line, int count)
+{
+    std::string text;
+    for (int i = 0; i < count; ++i)
+        text += line;
+    return text;
+}
+
+// Tasks 1 and 3 (object tasks 0 and 2) of 12 and taskThreeBytes bytes, subroutine 2 (object
+// sub 1) of 11 code bytes, which the brick closes with one more.
+std::string ProgramOneThreeTwo(int brickType = 6, int taskThreeBytes = 140)
+{
+    return "tobj 1 " + std::to_string(brickType) + " program\n" + "task 0\n" + Repeat(kSound, 6) +
+           "end\n" + "task 2\n" + Repeat(kSound, taskThreeBytes / 2) + "end\n" + "sub 1\n" +
+           Repeat(kSound, 5) + kReturn + "end\n";
+}
+
+std::vector<std::string> Lines(const std::string& text)
+{
+    std::vector<std::string> lines;
+    std::size_t start = 0;
+    for (std::size_t end; (end = text.find("\r\n", start)) != std::string::npos; start = end + 2)
+        lines.push_back(text.substr(start, end - start));
+    if (start < text.size())
+        lines.push_back(text.substr(start) + "<no line end>");
+    return lines;
+}
+
+int CountValues(const std::string& list)
+{
+    int count = 0;
+    std::size_t at = 0;
+    while ((at = list.find("0x", at)) != std::string::npos) {
+        ++count;
+        at += 2;
+    }
+    return count;
+}
+
+// Fields of one upload line after its four leading fields.
+std::string BytesOf(const std::string& line)
+{
+    std::size_t at = 0;
+    for (int i = 0; i < 4 && at != std::string::npos; ++i)
+        at = line.find(',', at + (i == 0 ? 0 : 1));
+    return at == std::string::npos ? "" : line.substr(at + 1);
+}
+
+class SimTools : public DialogFixture {
+protected:
+    void StartOpen(const std::string& brickLines = "")
+    {
+        ASSERT_NO_FATAL_FAILURE(Start(
+            std::string(kFastLink) + "[brick b1]\n" + brickLines + "[port COM1]\n", "Serial=COM1"));
+        ASSERT_NE(dialog().brickHandle(), 0);
+        ClearEvents();
+    }
+
+    void DownloadObject(const std::string& objectText)
+    {
+        SetText(ui::IdEditor, objectText);
+        SelectSource(ui::SourceListBin);
+        Click(ui::IdDownload);
+        Settle();
+        ASSERT_EQ(LastStatus().rfind("Downloaded ok", 0), 0u) << LastStatus();
+        ClearEvents();
+    }
+
+    std::string Info()
+    {
+        Click(ui::IdInfo);
+        return LastStatus();
+    }
+};
+
+TEST_F(SimTools, InfoListsExactlyTheDownloadedTasksAndSubroutines)
+{
+    ASSERT_NO_FATAL_FAILURE(StartOpen());
+    ASSERT_NO_FATAL_FAILURE(DownloadObject(ProgramOneThreeTwo()));
+    const std::string report = Info();
+    // Code bytes of the slot: 12 + 140 + 11.
+    EXPECT_NE(report.find("\tProgram slot: 1 tasks: 1, 3, subs: 2, size: 163 bytes\r\n"),
+              std::string::npos)
+        << report;
+    EXPECT_EQ(report.rfind("Active PBrick information:\r\n\tVersion (ROM.firmware): 0301.0309", 0),
+              0u)
+        << report;
+    EXPECT_NE(report.find("\tPort COM1 is RS232 IR\r\n"), std::string::npos) << report;
+    EXPECT_EQ(report.find("Port Tx Power"), std::string::npos) << report;
+    EXPECT_NE(report.find("\r\nGeneral information for "), std::string::npos) << report;
+    EXPECT_TRUE(Offers().empty());
+}
+
+TEST_F(SimTools, UploadGivesOneLinePerTaskAndSubroutine)
+{
+    ASSERT_NO_FATAL_FAILURE(StartOpen());
+    ASSERT_NO_FATAL_FAILURE(DownloadObject(ProgramOneThreeTwo()));
+    Click(ui::IdUpload);
+    EXPECT_EQ(LastStatus(), "Ok");
+    const std::vector<std::string> lines = Lines(Text(ui::IdEditor));
+    ASSERT_EQ(lines.size(), 3u) << Text(ui::IdEditor);
+    EXPECT_EQ(lines[0].rfind("task,0,12,", 0), 0u) << lines[0];
+    EXPECT_EQ(CountValues(BytesOf(lines[0])), 12) << lines[0];
+    EXPECT_EQ(BytesOf(lines[0]).substr(0, 9), "0x20,0x04");
+    // A task over 128 bytes is read in two commands and still gives one list.
+    EXPECT_EQ(lines[1].rfind("task,2,140,", 0), 0u) << lines[1];
+    EXPECT_EQ(CountValues(BytesOf(lines[1])), 140) << lines[1];
+    EXPECT_EQ(BytesOf(lines[1]).find(",,"), std::string::npos);
+    EXPECT_EQ(lines[2].rfind("sub,1,11,0,", 0), 0u) << lines[2];
+    EXPECT_EQ(CountValues(BytesOf(lines[2])), 11) << lines[2];
+    EXPECT_EQ(BytesOf(lines[2]).substr(BytesOf(lines[2]).size() - 4), "0x13");
+}
+
+TEST_F(SimTools, UploadOfAnEmptySlotEmptiesTheEditor)
+{
+    ASSERT_NO_FATAL_FAILURE(StartOpen());
+    SetText(ui::IdEditor, "something");
+    Click(ui::IdUpload);
+    EXPECT_EQ(LastStatus(), "Ok");
+    EXPECT_EQ(Text(ui::IdEditor), "");
+}
+
+TEST_F(SimTools, RoverListsOnlyTasksOfSlotOne)
+{
+    ASSERT_NO_FATAL_FAILURE(StartOpen("type = rover\n"));
+    SelectBrick(ui::BrickListRover);
+    ASSERT_NO_FATAL_FAILURE(DownloadObject(ProgramOneThreeTwo(5, 12)));
+    Click(ui::IdUpload);
+    EXPECT_EQ(LastStatus(), "Ok");
+    const std::vector<std::string> lines = Lines(Text(ui::IdEditor));
+    // A Rover's addresses name 16-bit cells, so its sizes count cells; what matters here is
+    // that only the tasks are listed.
+    ASSERT_EQ(lines.size(), 2u) << Text(ui::IdEditor);
+    EXPECT_EQ(lines[0].rfind("task,0,", 0), 0u) << lines[0];
+    EXPECT_EQ(lines[1].rfind("task,2,", 0), 0u) << lines[1];
+}
+
+TEST_F(SimTools, RoverInfoListsTheTasksAndSubroutinesOfSlotOne)
+{
+    ASSERT_NO_FATAL_FAILURE(StartOpen("type = rover\n"));
+    SelectBrick(ui::BrickListRover);
+    ASSERT_NO_FATAL_FAILURE(DownloadObject(ProgramOneThreeTwo(5, 12)));
+    const std::string report = Info();
+    EXPECT_NE(report.find("\tProgram slot: 1 tasks: 1, 3, subs: 2, size: "), std::string::npos)
+        << report;
+    EXPECT_EQ(report.find("size: -"), std::string::npos) << report;
+}
+
+TEST_F(SimTools, VersionAnswerGivesItsText)
+{
+    ASSERT_NO_FATAL_FAILURE(StartOpen());
+    tools::SessionBrickAccess access(*dialog().session());
+    tools::BrickQueries queries(access);
+    tessel::Long rom = 0;
+    tessel::Long firmware = 0;
+    char text[tools::kVersionTextSize] = {};
+    EXPECT_GE(queries.GetBrickVersion(dialog().brickHandle(), &rom, &firmware, text, sizeof text),
+              0);
+    EXPECT_EQ(rom, 301);
+    EXPECT_EQ(firmware, 309);
+    EXPECT_STREQ(text, "0301.0309");
+    std::uint16_t slot = 0;
+    EXPECT_GE(queries.GetProgramSlot(dialog().brickHandle(), &slot), 0);
+    EXPECT_EQ(slot, 1);
+}
+
+TEST_F(SimTools, MemoryRangeOfThreeHundredBytesJoinsItsChunks)
+{
+    ASSERT_NO_FATAL_FAILURE(StartOpen());
+    ASSERT_NO_FATAL_FAILURE(DownloadObject(ProgramOneThreeTwo(6, 300)));
+    tools::SessionBrickAccess access(*dialog().session());
+    tools::BrickQueries queries(access);
+    tools::BrickMemoryMap map;
+    ASSERT_GE(queries.GetMemoryMap(dialog().brickHandle(), &map), 0);
+    std::uint16_t start = 0;
+    std::uint16_t size = 0;
+    ASSERT_GE(queries.GetTaskLocation(dialog().brickHandle(), map, 1, 3, &start, &size), 0);
+    ASSERT_EQ(size, 300);
+
+    ReaderWriter* range = nullptr;
+    EXPECT_GE(queries.ReadMemoryRange(dialog().brickHandle(), start, 300, &range), 0);
+    std::string joined;
+    ASSERT_TRUE(tools::AppendFileText(range, joined));
+    tools::ReleaseHandle(&range);
+
+    // The same bytes read as 128, 128 and 44, one command each.
+    std::string expected;
+    const int chunks[] = {128, 128, 44};
+    int offset = 0;
+    for (int chunk : chunks) {
+        ReaderWriter* file = nullptr;
+        ASSERT_GE(queries.ReadMemory(dialog().brickHandle(),
+                                     static_cast<std::uint16_t>(start + offset), chunk, &file),
+                  0);
+        std::string text;
+        ASSERT_TRUE(tools::AppendFileText(file, text));
+        tools::ReleaseHandle(&file);
+        EXPECT_EQ(CountValues(text), chunk);
+        expected += (offset == 0 ? "" : ",") + text;
+        offset += chunk;
+    }
+    EXPECT_EQ(CountValues(joined), 300);
+    EXPECT_EQ(joined, expected);
+}
+
+class SimFirmware : public SimTools {
+protected:
+    void StartForFirmware(const std::string& brickLines)
+    {
+        ASSERT_NE(std::string(HARBOR_FIRMWARE_DIR), "");
+        ASSERT_NO_FATAL_FAILURE(StartOpen(brickLines));
+    }
+    void Download(const std::string& image)
+    {
+        SetText(ui::IdFirmwareFileName, std::string(HARBOR_FIRMWARE_DIR) + "/" + image);
+        Click(ui::IdNewFirmware);
+        Settle();
+    }
+};
+
+TEST_F(SimFirmware, SampleImageDownloadsAndTheVersionChanges)
+{
+    ASSERT_NO_FATAL_FAILURE(StartForFirmware("version = 0301.0200\n"));
+    EXPECT_NE(Info().find("Version (ROM.firmware): 0301.0200"), std::string::npos);
+    ClearEvents();
+    SelectBrick(ui::BrickListRover);
+    Download("Onyx2firm.kvo");
+    EXPECT_EQ(LastStatus(), "Downloaded firmware ok (0 ms)");
+    EXPECT_FALSE(dialog().firmwarePending());
+    EXPECT_TRUE(Offers().empty());
+    // The Brick list follows the detected model.
+    EXPECT_EQ(host().ListSelection(window(), ui::IdBrickList), ui::BrickListOnyx2);
+    EXPECT_NE(Info().find("Version (ROM.firmware): 0301.0309"), std::string::npos);
+}
+
+TEST_F(SimFirmware, CorruptedImageFailsWithItsCode)
+{
+    ASSERT_NO_FATAL_FAILURE(StartForFirmware(""));
+    Download("corrupt.kvo");
+    EXPECT_NE(LastStatus().find("Error (0xe0050415)"), std::string::npos) << LastStatus();
+    EXPECT_EQ(Offers().size(), 1u);
+    EXPECT_FALSE(dialog().firmwarePending());
+    EXPECT_EQ(host().FocusedControl(window()), ui::IdEditor);
+}
+
+TEST_F(SimFirmware, WithoutAPortNothingIsSent)
+{
+    ASSERT_NO_FATAL_FAILURE(Start(std::string(kFastLink)));
+    ClearEvents();
+    Click(ui::IdNewFirmware);
+    Click(ui::IdInfo);
+    Click(ui::IdUpload);
+    EXPECT_EQ(Statuses(),
+              (std::vector<std::string>{"Port not open", "Port not open", "Port not open"}));
+}
+
+} // namespace
+} // namespace tools_test
