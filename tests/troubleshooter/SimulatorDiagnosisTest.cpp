@@ -1,0 +1,221 @@
+// The diagnosis against the simulated library, through the dialog's session adapter.
+#include <gtest/gtest.h>
+
+#include <string>
+#include <vector>
+
+#include "LogHelpers.h"
+#include "SimulatorFixture.h"
+#include "errors/ErrorText.h"
+#include "platform/SystemInfoScripted.h"
+#include "troubleshooter/SessionBrickCalls.h"
+#include "troubleshooter/TroubleShooter.h"
+
+namespace {
+
+constexpr std::int32_t Packed(std::uint32_t value)
+{
+    return static_cast<std::int32_t>(value);
+}
+
+// Fails the test at any call: proves that nothing reached the library.
+class ForbiddingCalls final : public BrickCalls {
+public:
+    tessel::Long FindPort(char*, tessel::Size) override { return Forbidden(); }
+    tessel::Long Create(const char*) override { return Forbidden(); }
+    int Destroy(tessel::Long) override { return Forbidden(); }
+    tessel::Long Status(tessel::Long, tessel::Short, char*, tessel::Size) override
+    {
+        return Forbidden();
+    }
+    tessel::Long Set(tessel::Long, tessel::Short, tessel::Short) override { return Forbidden(); }
+    tessel::Long Get(tessel::Long, tessel::Short, tessel::Short*, char*, tessel::Size) override
+    {
+        return Forbidden();
+    }
+    tessel::Long FindFirst(tessel::Short, tessel::Short*, char*, tessel::Size) override
+    {
+        return Forbidden();
+    }
+    tessel::Long FindNext(tessel::Short, tessel::Short*, char*, tessel::Size) override
+    {
+        return Forbidden();
+    }
+    tessel::Long RunImmediate(tessel::Long, const char*, tessel::Long*) override
+    {
+        return Forbidden();
+    }
+
+private:
+    static int Forbidden()
+    {
+        ADD_FAILURE() << "a library call was made";
+        return -1;
+    }
+};
+
+class SimulatedDiagnosis : public SimulatorFixture {
+protected:
+    void Open(const char* port)
+    {
+        sessionSlot_ = session_.get();
+        handle = session().Create(port);
+        ASSERT_NE(handle, 0) << port;
+        calls = std::make_unique<SessionBrickCalls>(&sessionSlot_);
+        shooter =
+            std::make_unique<TroubleShooter>(calls.get(), &handle, LogPath().c_str(), &system);
+    }
+    std::string Body() const
+    {
+        const std::string log = Log();
+        return log.substr(log.find("\n\n") + 2);
+    }
+
+    platform::ScriptedSystemInfo system;
+    tessel::Long handle = 0;
+    std::unique_ptr<SessionBrickCalls> calls;
+    std::unique_ptr<TroubleShooter> shooter;
+    RecordingView view;
+};
+
+TEST_F(SimulatedDiagnosis, UnpluggedUsbTowerIsFoundAgain)
+{
+    Start("[brick onyx2]\n[port KIVOTOWER1]\nunplug-after = 0\n");
+    Open("KIVOTOWER1");
+    const tessel::Long failed = session().RunImmediate(handle, "sound 4", nullptr);
+    ASSERT_EQ(failed, Packed(0xE0050474u)) << "the tower should be unplugged now";
+    const tessel::Long lost = handle;
+
+    shooter->Diagnose(failed, &view);
+    EXPECT_EQ(view.shown, std::vector<int>{1105});
+    EXPECT_NE(handle, lost);
+    EXPECT_EQ(session().Status(handle, tessel::StatusPort, nullptr, 0), 1);
+    EXPECT_EQ(Body(),
+              "Computer: BENCH-PC\nUser name: tester\nProcessor Type: 586 (1)\n"
+              "Linux version 6.1.0-test (x86_64)\n"
+              "\tDiagnosing Error failed:\n"
+              "\t\tError (0xe0050474) from Tessel driver: Kivo USB Tower has been unplugged from "
+              "this port\n"
+              "\nGet Tower Type:\n\tGet port name ok\n\tPort 3 is KIVOTOWER1\n"
+              "\nFind USB Tower:\n\tFind port ok\n\tCreate port KIVOTOWER1 ok\n"
+              "\tSet brick type ok\n\tPort status ok\n"
+              "\nGet Tower Type:\n\tGet port name ok\n\tPort 3 is KIVOTOWER1\n"
+              "\tFind USB tower ok\n");
+    session().Destroy(handle);
+}
+
+TEST_F(SimulatedDiagnosis, ComPortNamedInsteadOfTheUsbTower)
+{
+    Start("[brick onyx2]\n[port KIVOTOWER1]\ntower = no\n[port COM1]\n");
+    Open("KIVOTOWER1");
+    EXPECT_TRUE(shooter->Diagnose(Packed(0xE005040Bu), &view));
+    // The port state (no tower) decides, not the given tower fault.
+    EXPECT_EQ(view.shown, std::vector<int>{1002});
+    EXPECT_NE(Body().find("\nFind USB Tower:\n\tFind port ok\n\tFind USB tower failed:\n"
+                          "\t\tError (0xe0050444) from Tessel driver: no more ports found\n"),
+              std::string::npos);
+    // The search closed the old port and opened none.
+    EXPECT_EQ(handle, 0);
+}
+
+TEST_F(SimulatedDiagnosis, NoMoreItemsOnAUsbTower)
+{
+    Start("[brick onyx2]\n[port KIVOTOWER1]\n[port COM1]\n");
+    Open("KIVOTOWER1");
+    shooter->Diagnose(Packed(0xE0050C52u), &view);
+    EXPECT_EQ(view.shown, std::vector<int>{1102});
+    EXPECT_EQ(Body().find("Find USB Tower"), std::string::npos);
+    session().Destroy(handle);
+}
+
+TEST_F(SimulatedDiagnosis, NoMoreItemsOnASerialTower)
+{
+    Start("[brick onyx2]\n[port KIVOTOWER1]\n[port COM1]\n");
+    Open("COM1");
+    shooter->Diagnose(Packed(0xE0050C52u), &view);
+    EXPECT_EQ(view.shown, std::vector<int>{1002});
+    session().Destroy(handle);
+}
+
+TEST_F(SimulatedDiagnosis, OpalFacilityJumpsNowhere)
+{
+    Start("[brick onyx2]\n[port COM1]\n");
+    Open("COM1");
+    EXPECT_FALSE(shooter->Diagnose(Packed(0xE0030010u), &view));
+    EXPECT_TRUE(view.shown.empty());
+    const std::string body = Body();
+    const std::string tail =
+        "\tJump facility failed:\n\t\tError (0xe0030010) from Opal: undefined label\n";
+    ASSERT_GE(body.size(), tail.size());
+    EXPECT_EQ(body.substr(body.size() - tail.size()), tail);
+    session().Destroy(handle);
+}
+
+TEST_F(SimulatedDiagnosis, DriverCode118ShowsOutcome1103)
+{
+    Start("[brick onyx2]\n[port KIVOTOWER1]\n");
+    Open("KIVOTOWER1");
+    shooter->Diagnose(Packed(0xE0050476u), &view);
+    EXPECT_EQ(view.shown, std::vector<int>{1103});
+    EXPECT_NE(
+        Body().find("\tDiagnosing Error failed:\n\t\tError (0xe0050476) from Tessel driver: "),
+        std::string::npos);
+    session().Destroy(handle);
+}
+
+TEST_F(SimulatedDiagnosis, RepairWithPortTypeZeroCallsNothing)
+{
+    ForbiddingCalls forbidding;
+    tessel::Long slot = 9;
+    TroubleShooter quiet(&forbidding, &slot, nullptr, &system);
+    EXPECT_FALSE(quiet.RepairUsbTower(0));
+    quiet.CloseLog();
+    EXPECT_EQ(slot, 9);
+}
+
+TEST_F(SimulatedDiagnosis, RepairFindsTheUnpluggedTowerWithoutLog)
+{
+    Start("[brick onyx2]\n[port KIVOTOWER1]\nunplug-after = 1\n");
+    sessionSlot_ = session_.get();
+    handle = session().Create("KIVOTOWER1");
+    EXPECT_EQ(session().RunImmediate(handle, "sound 4", nullptr), 0);
+    EXPECT_EQ(session().RunImmediate(handle, "sound 4", nullptr), Packed(0xE0050474u));
+    SessionBrickCalls adapter(&sessionSlot_);
+    TroubleShooter quiet(&adapter, &handle, nullptr, &system);
+    EXPECT_TRUE(quiet.RepairUsbTower(3));
+    EXPECT_EQ(session().RunImmediate(handle, "sound 4", nullptr), 0);
+    quiet.CloseLog();
+    EXPECT_FALSE(std::filesystem::exists(LogPath()));
+    session().Destroy(handle);
+}
+
+TEST_F(SimulatedDiagnosis, TestsReachTheSimulatedHardware)
+{
+    Start("[brick onyx2]\n[port KIVOTOWER1]\n[port COM1]\n[port COM2]\nstate = in-use\n"
+          "[port COM3]\n");
+    Open("KIVOTOWER1");
+    EXPECT_EQ(shooter->TestTower(), 0);
+    EXPECT_EQ(shooter->TestBrick(), 0);
+    EXPECT_EQ(shooter->SetUsbRange(2), 0);
+    EXPECT_EQ(shooter->TestSerialPort(2), Packed(0xE0050450u));
+    EXPECT_EQ(handle, 0);
+    EXPECT_EQ(shooter->TestSerialPort(3), 0);
+    EXPECT_EQ(shooter->FindUsbTower(), 0);
+    EXPECT_EQ(shooter->TestSerialPort(7), Packed(0xE0050C52u));
+    EXPECT_NE(Body().find("\tTest COM port COM3: failed:\n\t\tError (0xe0050c52) from Tessel tsl: "
+                          "no more items found\n"),
+              std::string::npos);
+}
+
+TEST_F(SimulatedDiagnosis, CallsAfterTheSessionIsGoneFailQuietly)
+{
+    Start("[brick onyx2]\n[port COM1]\n");
+    Open("COM1");
+    session().Destroy(handle);
+    session_.reset();
+    sessionSlot_ = nullptr;
+    EXPECT_EQ(shooter->TestTower(), StatusToError(tessel::kStatusNoLibrary));
+    EXPECT_EQ(shooter->FindTower(), Packed(tessel::kLinkFailed));
+}
+
+} // namespace

@@ -1,0 +1,74 @@
+// The brick session against the simulated library, for driving the Trouble Shooter through
+// scenarios. Each test writes its scenario and a settings file into a directory of its own;
+// the session then loads Tessel.dll by absolute path from the folder it was built into.
+#pragma once
+
+#include <gtest/gtest.h>
+#include <unistd.h>
+
+#include <cstdlib>
+#include <filesystem>
+#include <fstream>
+#include <memory>
+#include <string>
+
+#include "session/BrickSession.h"
+#include "workspace/LiveObjects.h"
+
+#ifndef HARBOR_SIM_DIR
+#define HARBOR_SIM_DIR ""
+#endif
+
+class SimulatorFixture : public testing::Test {
+protected:
+    void SetUp() override
+    {
+        static int number = 0;
+        dir_ = std::filesystem::temp_directory_path() /
+               ("harbor-shooter-" + std::to_string(getpid()) + "-" + std::to_string(++number));
+        std::filesystem::remove_all(dir_);
+        std::filesystem::create_directories(dir_);
+        ASSERT_NE(std::string(HARBOR_SIM_DIR), "") << "the simulated library is not built";
+    }
+    void TearDown() override
+    {
+        session_.reset();
+        EXPECT_EQ(workspace::LiveObjectCount(), 0);
+        std::error_code ignored;
+        std::filesystem::remove_all(dir_, ignored);
+    }
+
+    // Writes the scenario (link time 0 is added) and the settings, and starts the session.
+    void Start(const std::string& scenario)
+    {
+        ::setenv("TESSEL_SIM", WriteFile("scenario.txt", "link-time = 0\n" + scenario).c_str(), 1);
+        WriteFile("harbor.ini", SettingsText());
+        session_ = std::make_unique<BrickSession>(SettingsPath().c_str());
+        ASSERT_TRUE(session_->libraryLoaded()) << "Tessel.dll not found in " HARBOR_SIM_DIR;
+    }
+
+    static std::string SettingsText()
+    {
+        return "[PATHS]\nDLL=" + std::string(HARBOR_SIM_DIR) + "/\n[DEBUG]\nMEMFILES=TRUE\n";
+    }
+    std::string SettingsPath() const { return (dir_ / "harbor.ini").string(); }
+    std::string LogPath() const { return (dir_ / "shooter.log").string(); }
+    std::string Log() const { return ReadFile(LogPath()); }
+
+    std::string WriteFile(const std::string& name, const std::string& bytes)
+    {
+        const std::string path = (dir_ / name).string();
+        std::ofstream(path, std::ios::binary) << bytes;
+        return path;
+    }
+    static std::string ReadFile(const std::string& path)
+    {
+        std::ifstream in(path, std::ios::binary);
+        return std::string(std::istreambuf_iterator<char>(in), std::istreambuf_iterator<char>());
+    }
+
+    BrickSession& session() { return *session_; }
+    BrickSession* sessionSlot_ = nullptr; // the dialog's pointer, as the adapter reads it
+    std::filesystem::path dir_;
+    std::unique_ptr<BrickSession> session_;
+};
