@@ -14,6 +14,7 @@
 #include "app/GuiHost.h"
 #include "app/Registration.h"
 #include "app/Switches.h"
+#include "platform/ExecutablePath.h"
 #include "ui/TestClientDialog.h"
 #include "ui/headless/HeadlessHost.h"
 #include "ui/headless/HeadlessRunner.h"
@@ -51,6 +52,8 @@ int RunHeadless(const app::HarborOptions& options, const std::string& commandLin
     runOptions.waitTimeoutMs = options.timeoutMs;
     runOptions.fixedTicks = options.fixedTime;
     runOptions.echo = !options.quiet;
+    // The build puts the help file into help/ beside the program.
+    runOptions.helpDirectory = platform::ExecutableDirectory() + "help/";
 
     ui::HeadlessHost host;
     ui::TestClientDialog dialog(host, commandLine.c_str());

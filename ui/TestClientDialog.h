@@ -29,6 +29,7 @@
 #include "ui/Window.h"
 
 class BrickSession;
+class HelpViewer;
 class IError;
 class ReaderWriter;
 
@@ -158,6 +159,11 @@ public:
     std::int32_t stressIteration() const { return stressIteration_; }
     tessel::Short portType() const { return portType_; }
     tessel::Short traceOptions() const { return traceOptions_; }
+
+    // The help viewer a Trouble Shooter run opens its topics in; the host gives it (null: the
+    // help cannot open, and a run ends after its diagnosis). Not owned.
+    void SetHelpViewer(HelpViewer* viewer) { helpViewer_ = viewer; }
+    HelpViewer* helpViewer() const { return helpViewer_; }
 
     // Whether a handler showed a failure (ShowFailure, ShowError) since the last reset; the
     // headless host judges each command by it.
@@ -323,6 +329,7 @@ private:
     int downloadsInFlight_ = 0;
     int execsInFlight_ = 0;
     bool failureShown_ = false;
+    HelpViewer* helpViewer_ = nullptr;
 };
 
 } // namespace ui

@@ -75,7 +75,9 @@ void FrameFixture::Construct(const std::string& extraSettings, const std::string
                              const std::string& libraryDirectory)
 {
     ASSERT_FALSE(libraryDirectory.empty()) << "the library module is not built";
-    ::setenv("TESSEL_SIM", scratch_.Write("scenario.sim", kFastScenario).c_str(), 1);
+    ::setenv("TESSEL_SIM",
+             scratch_.Write("scenario.sim", scenario_.empty() ? kFastScenario : scenario_).c_str(),
+             1);
     scratch_.Write("harbor.ini", MergeSettings(extraSettings, libraryDirectory));
     host_ = std::make_unique<ui::HeadlessHost>();
     host_->FixTickCount(500);

@@ -45,6 +45,8 @@ protected:
     void Start(const std::string& extraSettings, const std::string& fileArgument = "",
                const std::string& libraryDirectory = SimulatorDirectory());
     void Stop();
+    // The simulator's scenario for the next Construct (default: kFastScenario).
+    void SetScenario(const std::string& scenario) { scenario_ = scenario; }
 
     ui::TestClientDialog& dialog() { return *dialog_; }
     ui::HeadlessHost& host() { return *host_; }
@@ -58,6 +60,7 @@ private:
     std::unique_ptr<ui::HeadlessHost> host_;
     std::unique_ptr<ui::TestClientDialog> dialog_;
     std::vector<ui::HeadlessEvent> events_;
+    std::string scenario_;
 };
 
 // The simulator's default towers with no transmission time.

@@ -142,3 +142,45 @@ TEST_F(RunnerTest, DownloadIsWaitedForBeforeTheNextCommand)
     ASSERT_NE(downloaded, std::string::npos) << text;
     EXPECT_LT(downloaded, text.find("> Print status"));
 }
+
+TEST_F(RunnerTest, HelpSessionTakesTheFollowingCommands)
+{
+    // No tower: the port search fails and the Trouble Shooter is offered.
+    SetScenario("link-time = 0\n[brick onyx2]\n[port COM1]\ntower = no\n");
+    HeadlessOptions options;
+    options.helpDirectory = HARBOR_HELP_DIR;
+    EXPECT_EQ(Run("Answer yes\nOpen\nHelp Topic Onyx_ok\nHelp 2000\nEditor after\n"
+                  "Expect Editor after\n",
+                  "", options),
+              HeadlessFailed)
+        << out.str();
+    const std::string text = out.str();
+    const auto offer = text.find("-> yes");
+    const auto opened = text.find("[help] opened shooter.hlp");
+    const auto topic = text.find("[help] topic Onyx_ok");
+    const auto closed = text.find("[help] closed");
+    const auto after = text.find("> Editor after");
+    ASSERT_NE(offer, std::string::npos) << text;
+    ASSERT_NE(closed, std::string::npos) << text;
+    EXPECT_LT(offer, opened);
+    EXPECT_LT(opened, topic);
+    EXPECT_LT(topic, closed);
+    EXPECT_LT(closed, after);
+    EXPECT_EQ(failed, 1) << text;
+}
+
+TEST_F(RunnerTest, EndOfInputClosesAnOpenHelpSession)
+{
+    SetScenario("link-time = 0\n[brick onyx2]\n[port COM1]\ntower = no\n");
+    HeadlessOptions options;
+    options.helpDirectory = HARBOR_HELP_DIR;
+    EXPECT_EQ(Run("Answer yes\nOpen\n", "", options), HeadlessFailed) << out.str();
+    EXPECT_NE(out.str().find("[help] closed"), std::string::npos) << out.str();
+    EXPECT_TRUE(host().QuitRequested());
+}
+
+TEST_F(RunnerTest, HelpWithoutASessionIsRefused)
+{
+    EXPECT_EQ(Run("Help 2002\n"), HeadlessFailed);
+    EXPECT_NE(out.str().find("refused: no help is open"), std::string::npos);
+}

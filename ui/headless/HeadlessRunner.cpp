@@ -9,6 +9,7 @@
 #include <istream>
 #include <ostream>
 
+#include "troubleshooter/HeadlessHelpViewer.h"
 #include "ui/TestClientDialog.h"
 
 namespace ui {
@@ -192,10 +193,14 @@ HeadlessRunner::HeadlessRunner(HeadlessHost& host, TestClientDialog& dialog, std
         host_.FixTickCount(0);
     host_.SetListener([this](const HeadlessEvent& event) { onEvent(event); });
     host_.SetIdleHandler([this] { return idle(); });
+    helpViewer_ = std::make_unique<HeadlessHelpViewer>(
+        host_, [this](const std::string& line) { print(line); }, options_.helpDirectory);
+    dialog_.SetHelpViewer(helpViewer_.get());
 }
 
 HeadlessRunner::~HeadlessRunner()
 {
+    dialog_.SetHelpViewer(nullptr);
     host_.SetListener(nullptr);
     host_.SetIdleHandler(nullptr);
 }
@@ -369,13 +374,20 @@ bool HeadlessRunner::idle()
 
 void HeadlessRunner::finish()
 {
-    // A help session still open ends first: its nested loop returns, and the handler that
-    // offered the Trouble Shooter finishes before the window goes.
+    // A help session still open ends first, as when a person closes the help window: its
+    // nested loop returns, and the handler that offered the Trouble Shooter finishes before
+    // the dialog window goes.
+    if (!helpCloseSent_ && helpViewer_->IsOpen()) {
+        helpCloseSent_ = true;
+        inputEnded_ = true;
+        helpViewer_->InputEnded();
+        return;
+    }
     const WindowHandle help = host_.FindWindowOfClass(kHelpWindowClass);
     if (help != kNoWindow && !helpCloseSent_) {
         helpCloseSent_ = true;
         inputEnded_ = true;
-        host_.SendMessage(help, kMsgCommand, MakeCommand(kHelpQuitCommand), 0);
+        host_.PostMessage(help, kMsgCommand, MakeCommand(kHelpQuitCommand), 0);
         return;
     }
     exitSent_ = true;
@@ -594,20 +606,28 @@ bool HeadlessRunner::execute(const std::string& rawLine)
         break;
     }
     case Action::Help: {
+        // "Help ID [NUMBER]" follows a command link of the shown topic, "Help Topic NAME" a
+        // plain link to another topic.
         const std::size_t blank = argument.find_first_of(" \t");
+        const std::string first = argument.substr(0, blank);
+        const std::string rest =
+            blank == std::string::npos ? std::string() : Trim(argument.substr(blank));
         long id = 0;
         long value = 0;
-        if (!ParseInt(argument.substr(0, blank), id) ||
-            (blank != std::string::npos && !ParseInt(Trim(argument.substr(blank)), value)))
-            return badCommand(name + " takes a command id and an optional number");
-        const WindowHandle help = host_.FindWindowOfClass(kHelpWindowClass);
-        if (help == kNoWindow) {
-            print("refused: no help window is open");
+        const bool topic = EqualNoCase(first, "topic");
+        if (topic ? rest.empty()
+                  : (!ParseInt(first, id) || (!rest.empty() && !ParseInt(rest, value))))
+            return badCommand(name + " takes a command id and an optional number, or Topic NAME");
+        if (!helpViewer_->IsOpen()) {
+            print("refused: no help is open");
             commandFailed_ = true;
             break;
         }
-        host_.SendMessage(help, kMsgCommand, MakeCommand(static_cast<int>(id)),
-                          static_cast<LParam>(value));
+        const bool done =
+            topic ? helpViewer_->ShowTopic(rest)
+                  : helpViewer_->Command(static_cast<int>(id), static_cast<std::int32_t>(value));
+        if (!done)
+            commandFailed_ = true;
         break;
     }
     }

@@ -11,9 +11,12 @@
 
 #include <cstdint>
 #include <iosfwd>
+#include <memory>
 #include <string>
 
 #include "ui/headless/HeadlessHost.h"
+
+class HeadlessHelpViewer;
 
 namespace ui {
 
@@ -24,6 +27,9 @@ struct HeadlessOptions {
     int waitTimeoutMs = 30000;  // how long to wait for a download or execution to report
     bool fixedTicks = false;    // elapsed times read 0, for repeatable transcripts
     bool echo = true;           // print each command as "> command"
+    // Where the Trouble Shooter's help file is looked for, with a trailing "/"; "" for the
+    // current directory.
+    std::string helpDirectory;
 };
 
 enum HeadlessStatus : int { HeadlessOk = 0, HeadlessFailed = 1, HeadlessBadCommand = 2 };
@@ -82,6 +88,8 @@ private:
     bool inputEnded_ = false;
     bool helpCloseSent_ = false;
     bool exitSent_ = false;
+    // Shows the Trouble Shooter's help topics as lines and carries the Help commands.
+    std::unique_ptr<HeadlessHelpViewer> helpViewer_;
 };
 
 } // namespace ui
