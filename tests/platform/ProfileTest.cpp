@@ -92,6 +92,20 @@ TEST_F(ProfileReading, DefaultsForMissingFileSectionAndKey)
     EXPECT_EQ(value("S", "k"), "");
 }
 
+TEST_F(ProfileReading, DirectoryInPlaceOfFileGivesDefaults)
+{
+    path = dir.path();
+    EXPECT_EQ(value("S", "k"), "dflt");
+    EXPECT_EQ(keys("S"), "");
+}
+
+TEST_F(ProfileReading, ValueRunsFromTheFirstEqualsSign)
+{
+    path = dir.write("a.ini", "[S]\nk = a=b ; not a comment\n[T] trailing\nx=1\n");
+    EXPECT_EQ(value("S", "k"), "a=b ; not a comment");
+    EXPECT_EQ(value("T", "x"), "1");
+}
+
 TEST_F(ProfileReading, EmptyFileAndFileWithoutSectionsGiveDefaults)
 {
     path = dir.write("empty.ini", "");
