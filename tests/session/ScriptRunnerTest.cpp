@@ -1,5 +1,8 @@
+#include <gmock/gmock.h>
+
 #include "SessionFixture.h"
 #include "errors/ErrorSink.h"
+#include "errors/ErrorText.h"
 
 using tessel::Long;
 
@@ -353,6 +356,36 @@ TEST_F(ScriptRunnerFiles, ReleaseKeepsAHandleOthersStillHold)
     EXPECT_EQ(mine, handle);
     BrickSession::ReleaseReaderWriter(&mine);
     EXPECT_EQ(mine, nullptr);
+}
+
+} // namespace
+
+namespace {
+
+// The codes the runner builds are the ones the catalogue explains.
+TEST(ScriptRunnerCodes, EachCodeHasItsCatalogueText)
+{
+    const struct {
+        std::uint32_t code;
+        const char* text;
+    } codes[] = {
+        {BrickSession::kNullRoot, "illegal NULL root in tessel"},
+        {BrickSession::kInsertFailed, "Insert DirEnt failed in tessel"},
+        {BrickSession::kCreateFailed, "ReaderWriter Create failed in tessel"},
+        {BrickSession::kNullSourcePath, "illegal NULL source path"},
+        {BrickSession::kNullResultPath, "illegal NULL result path"},
+        {BrickSession::kNullFirmwarePath, "illegal NULL firmware path"},
+        {BrickSession::kNullTempPath, "illegal NULL temp path"},
+        {tessel::kLinkFailed, "failed to link to Tessel.dll"},
+    };
+    for (const auto& entry : codes) {
+        EXPECT_EQ(ErrorValue(entry.code).packedCode(), entry.code);
+        EXPECT_THAT(GetErrorText(static_cast<tessel::Long>(entry.code), nullptr),
+                    ::testing::HasSubstr(entry.text));
+    }
+    EXPECT_EQ(ErrorValue(3, 5, 3, 129).packedCode(), BrickSession::kNullRoot);
+    EXPECT_EQ(ErrorValue(3, 5, 3, 135).packedCode(), BrickSession::kNullTempPath);
+    EXPECT_EQ(ErrorValue(3, 5, 3, 65).packedCode(), tessel::kLinkFailed);
 }
 
 } // namespace
