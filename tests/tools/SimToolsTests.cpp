@@ -119,6 +119,22 @@ TEST_F(SimTools, InfoListsExactlyTheDownloadedTasksAndSubroutines)
     EXPECT_TRUE(Offers().empty());
 }
 
+TEST_F(SimTools, SilentBrickLeavesItsSectionWithOnlyTheHeading)
+{
+    ASSERT_NO_FATAL_FAILURE(Start(std::string(kFastLink) + "[brick b1]\nalive = no\n" +
+                                      "[port COM1]\n[port COM2]\nstate = missing\n",
+                                  "Serial=COM1"));
+    ASSERT_NE(dialog().brickHandle(), 0);
+    ClearEvents();
+    const std::string report = Info();
+    EXPECT_EQ(report.rfind("Active PBrick information:\r\n\r\nActive Port information:\r\n", 0), 0u)
+        << report;
+    EXPECT_NE(report.find("\tPort COM1 is RS232 IR\r\n"), std::string::npos) << report;
+    // The port that does not exist is listed with its reason.
+    EXPECT_NE(report.find("COM2(-), "), std::string::npos) << report;
+    EXPECT_NE(report.find("\r\nGeneral information for "), std::string::npos) << report;
+}
+
 TEST_F(SimTools, UploadGivesOneLinePerTaskAndSubroutine)
 {
     ASSERT_NO_FATAL_FAILURE(StartOpen());
