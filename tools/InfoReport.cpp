@@ -159,7 +159,9 @@ void InfoReport::AddProgram(tessel::Long hBrick, int slot, const BrickMemoryMap&
     if (subCount > 0) {
         report_.append("%s", subs.text());
     }
-    if (taskCount == 0 && subCount == 0) {
+    // Only an accepted slot (1 to 5) lists anything; the check keeps the map indexes below
+    // in range whatever the brick answered.
+    if ((taskCount == 0 && subCount == 0) || slot < 1 || slot > BrickMemoryMap::kSlots) {
         report_.append("\r\n");
         return;
     }
@@ -173,8 +175,7 @@ void InfoReport::AddProgram(tessel::Long hBrick, int slot, const BrickMemoryMap&
         report_.append("size: %d bytes\r\n", locatedSize);
         return;
     }
-    // Something was listed, so the slot was accepted (1 to 5): the subroutine area plus the
-    // task area of the slot, less 8.
+    // The subroutine area plus the task area of the slot, less its 8 closing bytes.
     const std::uint16_t* w = map.words;
     int subArea = static_cast<std::uint16_t>(w[8 * slot] - w[8 * (slot - 1)]);
     int taskArea = static_cast<std::uint16_t>(w[40 + 10 * slot] - w[40 + 10 * (slot - 1)]);
