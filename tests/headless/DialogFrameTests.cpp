@@ -479,3 +479,82 @@ TEST_F(RecordingFrame, TeardownWithoutReceptionOnlyDestroys)
     EXPECT_EQ(state().calls[tessel::SlotExec].count, 0);
     EXPECT_EQ(state().calls[tessel::SlotDestroy].count, 1);
 }
+
+TEST_F(RecordingFrame, AsyncExecutionResultNumberLivesInTheDialog)
+{
+    state().results[tessel::SlotCreate] = 9;
+    Start("[PORTS]\nUSB=T1\n", "", headless_test::RecordingLibraryDirectory());
+    ASSERT_EQ(dialog().StartAsyncExec(nullptr), 0);
+    const void* first = state().calls[tessel::SlotExec].pointers[1];
+    ASSERT_EQ(dialog().StartAsyncExec(nullptr), 0);
+    // The same place both times, so not a handler's stack slot: the dialog's own member.
+    EXPECT_NE(first, nullptr);
+    EXPECT_EQ(state().calls[tessel::SlotExec].pointers[1], first);
+    EXPECT_EQ(state().calls[tessel::SlotExec].pointers[4], dialog().CallbackContext());
+    EXPECT_EQ(dialog().operationsInFlight(), 2);
+
+    host().PostMessage(window(), kMsgExecResult, 0, 0);
+    host().DispatchPending();
+    EXPECT_EQ(dialog().operationsInFlight(), 1);
+
+    // A call the library refuses reports nothing back, so it is not waited for.
+    state().results[tessel::SlotExec] = static_cast<tessel::Long>(0xE0050C41u);
+    EXPECT_LT(dialog().StartAsyncExec(nullptr), 0);
+    EXPECT_EQ(dialog().operationsInFlight(), 1);
+}
+
+TEST_F(RecordingFrame, DownloadIsInFlightUntilItsLastReport)
+{
+    state().results[tessel::SlotCreate] = 9;
+    Start("[PORTS]\nUSB=T1\n", "", headless_test::RecordingLibraryDirectory());
+    ReaderWriter* object = nullptr;
+    ASSERT_GE(dialog().session()->TranslateText(6, tessel::FileScript, "a", &object, nullptr,
+                                                nullptr, nullptr),
+              0);
+    ASSERT_EQ(BrickSession::CountCommands(object), 1);
+    ClearEvents();
+    // The recording library has no brick: the start-up showed "no brick detected".
+    dialog().ResetFailureShown();
+    EXPECT_TRUE(dialog().DownloadObject(object));
+    BrickSession::ReleaseReaderWriter(&object);
+    ASSERT_EQ(state().calls[tessel::SlotDownload].count, 1);
+    EXPECT_EQ(state().calls[tessel::SlotDownload].pointers[2], dialog().CallbackContext());
+    EXPECT_EQ(dialog().downloadTotal(), 1);
+    EXPECT_EQ(dialog().operationsInFlight(), 1);
+    ASSERT_FALSE(EventsOf(Kind::Status).empty());
+    EXPECT_EQ(EventsOf(Kind::Status)[0].text, "Downloading");
+    EXPECT_GE(host().RepaintCount(), 1);
+
+    ASSERT_TRUE(host().PostMessage(window(), kMsgDownloadProgress, 0, 1));
+    host().DispatchPending();
+    EXPECT_EQ(dialog().operationsInFlight(), 0);
+    EXPECT_FALSE(dialog().failureShown());
+}
+
+TEST_F(RecordingFrame, DownloadFailureReportEndsTheWait)
+{
+    state().results[tessel::SlotCreate] = 9;
+    Start("[PORTS]\nUSB=T1\n", "", headless_test::RecordingLibraryDirectory());
+    ReaderWriter* object = nullptr;
+    ASSERT_GE(dialog().session()->TranslateText(6, tessel::FileScript, "a b c", &object, nullptr,
+                                                nullptr, nullptr),
+              0);
+    EXPECT_TRUE(dialog().DownloadObject(object));
+    BrickSession::ReleaseReaderWriter(&object);
+    ASSERT_TRUE(
+        host().PostMessage(window(), kMsgDownloadProgress, static_cast<WParam>(0xE0050C41u), 0));
+    host().DispatchPending();
+    EXPECT_EQ(dialog().operationsInFlight(), 0);
+    EXPECT_TRUE(dialog().failureShown());
+}
+
+TEST_F(RecordingFrame, ObjectWithoutCommandsIsNotDownloaded)
+{
+    state().results[tessel::SlotCreate] = 9;
+    Start("[PORTS]\nUSB=T1\n", "", headless_test::RecordingLibraryDirectory());
+    EXPECT_FALSE(dialog().DownloadObject(nullptr));
+    EXPECT_EQ(host().ControlText(window(), IdStatusBox), "No code");
+    EXPECT_TRUE(dialog().failureShown());
+    EXPECT_EQ(state().calls[tessel::SlotDownload].count, 0);
+    EXPECT_EQ(dialog().operationsInFlight(), 0);
+}
