@@ -512,7 +512,7 @@ std::unique_ptr<char[]> TestClientDialog::ReadFileText(ReaderWriter* file)
 bool TestClientDialog::DownloadObject(ReaderWriter* object)
 {
     downloadTotal_ = BrickSession::CountCommands(object);
-    if (downloadTotal_ == 0) {
+    if (downloadTotal_ <= 0) {
         ShowFailure("No code");
         return false;
     }
