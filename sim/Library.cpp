@@ -473,6 +473,9 @@ Long Library::set(Long handle, Short property, Short value)
         return kOk;
     }
     case tessel::PropCollectStats:
+        if (!connection->port->spec.statistics) {
+            return kWispStatsDisabled;
+        }
         connection->collecting = value != 0;
         if (value != 0) {
             connection->stats = LinkStats{};

@@ -187,6 +187,14 @@ bool ParsePortKey(PortSpec& port, const std::string& key, const std::string& val
     if (key == "loss") {
         return ParseInt(value, port.loss) && port.loss >= 0 && port.loss <= 100;
     }
+    if (key == "statistics") {
+        const std::string word = Lower(value);
+        if (word != "ok" && word != "refused") {
+            return false;
+        }
+        port.statistics = word == "ok";
+        return true;
+    }
     if (key == "brick") {
         port.brick = Lower(value) == "none" ? std::string() : value;
         return true;

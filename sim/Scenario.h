@@ -32,6 +32,7 @@ struct PortSpec {
     bool longRange = false;        // USB towers only
     std::int32_t unplugAfter = -1; // USB: unplugged after this many packets; -1 never
     std::int32_t loss = 0;         // percent of packets lost on the infrared link
+    bool statistics = true;        // false: the tower refuses to collect statistics
     std::string brick;             // name of the brick in front of the tower; "" none
 };
 

@@ -224,6 +224,16 @@ TEST_F(Properties, StatisticsCountTheTrafficAfterCollectionStarts)
     EXPECT_EQ(tiny[4], 'x');
 }
 
+TEST_F(Properties, ATowerMayRefuseStatistics)
+{
+    useScenario("[brick b]\n[port COM1]\nstatistics = refused\n");
+    const Long handle = open("COM1");
+    char text[tessel::kStatusTextSize];
+    EXPECT_EQ(api().set(handle, tessel::PropCollectStats, 1), Code(0xE1000206u));
+    EXPECT_EQ(api().get(handle, tessel::PropStatistics, nullptr, text, sizeof text),
+              Code(0xE1000206u));
+}
+
 TEST_F(Properties, EveryReadablePropertyAnswers)
 {
     const Long handle = open("KIVOTOWER1");
