@@ -539,7 +539,11 @@ private:
             const int count = expression();
             expect(")");
             const Operand counter = newTemp(true, t.offset);
+            const int liveGlobal = globalTemps_;
+            const int liveLocal = localTemps_;
             generateInto(counter, count);
+            globalTemps_ = liveGlobal; // what computed the count is dead; the counter lives on
+            localTemps_ = liveLocal;
             const int top = newLabel();
             const int done = newLabel();
             bind(top);
@@ -551,21 +555,21 @@ private:
             bind(done);
         } else if (w == "while") {
             expect("(");
-            const int condition = expression();
+            const int test = expression();
             expect(")");
             const int top = newLabel();
             const int done = newLabel();
             bind(top);
-            jumpUnless(condition, done);
+            condition(test, done);
             statement(depth + 1);
             emit(Op::Jump, t.offset, {L(top)});
             bind(done);
         } else if (w == "if") {
             expect("(");
-            const int condition = expression();
+            const int test = expression();
             expect(")");
             const int otherwise = newLabel();
-            jumpUnless(condition, otherwise);
+            condition(test, otherwise);
             statement(depth + 1);
             if (acceptWord("else")) {
                 const int done = newLabel();
@@ -1162,6 +1166,16 @@ private:
             return;
         }
         }
+    }
+
+    // A condition's temporaries are dead once it has jumped, so the body may use them again.
+    void condition(int n, int target)
+    {
+        const int liveGlobal = globalTemps_;
+        const int liveLocal = localTemps_;
+        jumpUnless(n, target);
+        globalTemps_ = liveGlobal;
+        localTemps_ = liveLocal;
     }
 
     int newLabel()

@@ -14,7 +14,8 @@
 namespace tessel::lang {
 namespace {
 
-void Produce(const TranslateRequest& request, TranslateResult& result)
+void Produce(const TranslateRequest& request, const TranslateLimits& limits,
+             TranslateResult& result)
 {
     if (request.targetType != TargetObject && request.targetType != TargetListing) {
         FailPacked(LibraryError(kBadTargetType), 0);
@@ -25,7 +26,7 @@ void Produce(const TranslateRequest& request, TranslateResult& result)
     if (!CapacitiesOf(request.brickType).supported) {
         Fail(kBadTarget, 0);
     }
-    if (request.source.size() > TranslateLimits{}.maxSourceBytes) {
+    if (request.source.size() > limits.maxSourceBytes) {
         Fail(kSourceRead, 0, "source too large");
     }
     Program program;
@@ -97,7 +98,7 @@ TranslateResult Translator::translate(const TranslateRequest& request)
                                 ? WriteObject(compiled.program)
                                 : WriteListing(compiled.program, compiled.listing);
         } else {
-            Produce(request, result);
+            Produce(request, limits_, result);
         }
         return result;
     } catch (Failure& failure) {
