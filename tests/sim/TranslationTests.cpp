@@ -1,0 +1,178 @@
+// tslTranslate and tslValidate against a real workspace tree: sources read through handles,
+// includes found under "/Script/Include/", the sink filled on failure, the scratch files beside
+// the working files, and translated code that the simulated brick runs.
+#include <fstream>
+#include <sstream>
+
+#include "Objects.h"
+#include "SimHarness.h"
+
+namespace simtest {
+namespace {
+
+using tessel::Long;
+
+std::string ReadHostFile(const std::string& path)
+{
+    std::ifstream file(path, std::ios::binary);
+    std::stringstream content;
+    content << file.rdbuf();
+    return content.str();
+}
+
+class Translation : public SimTest {
+protected:
+    // Translates text of a source type into object.txt (target type 4 or 7).
+    Long translate(const std::string& text, std::int32_t sourceType = tessel::FileScript,
+                   std::int32_t targetType = tessel::FileCode, tessel::Short brickType = 6)
+    {
+        ws().write("/Script/Temp/source.txt", text, sourceType);
+        ReaderWriter* source = ws().open("/Script/Temp/source.txt", sourceType);
+        ReaderWriter* target = ws().open("/Script/Temp/object.txt", targetType);
+        const Long result = api().translate(brickType, source, target, &sink_, nullptr, nullptr);
+        source->release();
+        target->release();
+        return result;
+    }
+
+    void installHeader()
+    {
+        ws().add("/Script/Include/onyx2mlt.h");
+        ws().write("/Script/Include/onyx2mlt.h",
+                   ReadHostFile(std::string(TESSEL_RESOURCE_DIR) + "/include/Onyx2MLT.h"));
+    }
+
+    ErrorSink sink_;
+};
+
+TEST_F(Translation, AnImmediateScriptRunsOnTheBrick)
+{
+    ASSERT_EQ(translate("brick version?"), 0);
+    const std::string object = ws().read("/Script/Temp/object.txt");
+    EXPECT_NE(object.find("cmd"), std::string::npos) << object;
+    const Long handle = open("KIVOTOWER1");
+    ReaderWriter* code = ws().open("/Script/Temp/object.txt", tessel::FileCode);
+    ReaderWriter* result = ws().open("/Script/Temp/result.txt", tessel::FileResult);
+    Long number = 0;
+    EXPECT_EQ(api().exec(handle, code, &number, result, nullptr, nullptr), 0);
+    EXPECT_EQ(Workspace::ReadHandle(result), "0x00,0x03,0x00,0x01,0x00,0x03,0x00,0x09");
+    result->release();
+    code->release();
+}
+
+TEST_F(Translation, IncludesComeFromTheWorkspaceUnderTheirLowerCaseName)
+{
+    const std::string program =
+        "program Macro2CSV{#include<Onyx2MLT.h>main{bb_PlayNote(440,50,60)}}";
+    EXPECT_EQ(translate(program), Code(0xE0050892u)); // 146: no include directory yet
+    EXPECT_STREQ(sink_.GetText(), "Onyx2MLT.h");
+    EXPECT_GT(sink_.GetPosition(), 0);
+    installHeader();
+    EXPECT_EQ(translate(program), 0) << sink_.GetText();
+    // The translation's scratch files beside the working files.
+    EXPECT_NE(ws().read("/Script/Temp/symtab.txt").find("Macro2CSV"), std::string::npos)
+        << ws().read("/Script/Temp/symtab.txt");
+    EXPECT_NE(ws().read("/Script/Temp/context.txt").find("brick type 6"), std::string::npos);
+}
+
+TEST_F(Translation, ACsvListingShowsWhatTheMacroExpandsTo)
+{
+    installHeader();
+    ASSERT_EQ(translate("program Macro2CSV{#include<Onyx2MLT.h>main{bb_PlayNote(440,50,60)}}",
+                        tessel::FileScript, tessel::FileCsvListing),
+              0)
+        << sink_.GetText();
+    const std::string listing = ws().read("/Script/Temp/object.txt");
+    EXPECT_EQ(listing.rfind("250,", 0), 0u) << listing;
+    EXPECT_NE(listing.find("303,"), std::string::npos) << listing;
+    EXPECT_NE(listing.find("407"), std::string::npos) << listing;
+}
+
+TEST_F(Translation, ErrorsGoToTheSinkWithPositionAndDetail)
+{
+    const std::string program = "program P {\n    main {\n        count = 1\n    }\n}\n";
+    EXPECT_EQ(translate(program), Code(0xE0050810u)); // 16: variable not declared
+    EXPECT_EQ(sink_.GetPosition(), static_cast<std::int32_t>(program.find("count")));
+    EXPECT_STREQ(sink_.GetText(), "count");
+}
+
+TEST_F(Translation, BadHandlesAndTypesAreRefused)
+{
+    ReaderWriter* source = ws().open("/Script/Temp/source.txt", 0);
+    ReaderWriter* target = ws().open("/Script/Temp/object.txt", tessel::FileCode);
+    EXPECT_EQ(api().translate(6, source, target, &sink_, nullptr, nullptr), Code(0xE0050C94u));
+    source->setType(tessel::FileScript);
+    target->setType(0);
+    EXPECT_EQ(api().translate(6, source, target, &sink_, nullptr, nullptr), Code(0xE0050C96u));
+    EXPECT_EQ(api().translate(6, nullptr, target, &sink_, nullptr, nullptr), Code(0xE0050C64u));
+    EXPECT_EQ(api().translate(6, source, nullptr, &sink_, nullptr, nullptr), Code(0xE0050C64u));
+    EXPECT_EQ(api().validate(6, nullptr, &sink_, nullptr, nullptr), Code(0xE0050C64u));
+    source->release();
+    target->release();
+}
+
+TEST_F(Translation, ValidateChecksWithoutWriting)
+{
+    ws().write("/Script/Temp/object.txt", "untouched");
+    ws().write("/Script/Temp/source.txt", "sound 4", tessel::FileScript);
+    ReaderWriter* source = ws().open("/Script/Temp/source.txt", tessel::FileScript);
+    EXPECT_EQ(api().validate(6, source, &sink_, nullptr, nullptr), 0);
+    ws().write("/Script/Temp/source.txt", "sound", tessel::FileScript);
+    EXPECT_LT(api().validate(6, source, &sink_, nullptr, nullptr), 0);
+    EXPECT_LT(api().validate(6, source, nullptr, nullptr, nullptr), 0); // no sink is fine
+    source->release();
+    EXPECT_EQ(ws().read("/Script/Temp/object.txt"), "untouched");
+}
+
+TEST_F(Translation, HostileSourcesFailWithACompilerCode)
+{
+    std::string binary;
+    for (int i = 0; i < 70000; ++i) {
+        binary += static_cast<char>(i * 131 % 256);
+    }
+    EXPECT_LT(translate(binary), 0);
+    std::string nested = "program P { main { ";
+    for (int i = 0; i < 5000; ++i) {
+        nested += "if (1 < 2) { ";
+    }
+    EXPECT_LT(translate(nested), 0);
+    EXPECT_LT(translate("#define A A A\nA"), 0);
+}
+
+TEST_F(Translation, FirmwareImagesDownloadInBootMode)
+{
+    useShipped("no-firmware.sim");
+    const Long handle = open("KIVOTOWER1");
+    Long number = 0;
+    std::string version;
+    ASSERT_EQ(run(handle, Immediate(kBootRom), &number), 0); // before object.txt is filled
+    const std::string image =
+        ReadHostFile(std::string(TESSEL_RESOURCE_DIR) + "/firmware/Onyx2firm.kvo");
+    ASSERT_FALSE(image.empty());
+    ASSERT_EQ(translate(image, tessel::FileFirmware), 0) << sink_.GetText();
+    const std::string object = ws().read("/Script/Temp/object.txt");
+    Long total = 0;
+    for (std::size_t at = object.find("cmd"); at != std::string::npos;
+         at = object.find("cmd", at + 3)) {
+        ++total;
+    }
+    ASSERT_GT(total, 0);
+    Recorder recorder;
+    ReaderWriter* code = ws().open("/Script/Temp/object.txt", tessel::FileCode);
+    ASSERT_EQ(api().download(handle, code, &Recorder::Callback, &recorder), 0);
+    code->release();
+    ASSERT_TRUE(recorder.waitForEnd(total));
+    EXPECT_EQ(recorder.reports().back().status, 0);
+    ASSERT_EQ(run(handle, Immediate(kBootFirmware), &number), 0);
+    ASSERT_EQ(run(handle, Immediate(kVersion), &number, &version), 0);
+    EXPECT_EQ(version, "0x00,0x03,0x00,0x01,0x00,0x03,0x00,0x09");
+    char text[tessel::kStatusTextSize];
+    EXPECT_EQ(api().status(handle, tessel::StatusBrick, text, sizeof text), 1) << text;
+
+    const std::string corrupt =
+        ReadHostFile(std::string(TESSEL_RESOURCE_DIR) + "/firmware/corrupt.kvo");
+    EXPECT_EQ(translate(corrupt, tessel::FileFirmware), Code(0xE0050415u));
+}
+
+} // namespace
+} // namespace simtest
