@@ -48,11 +48,11 @@ protected:
         std::filesystem::remove_all(dir_, ignored);
     }
 
-    void Open(bool withHeader, bool memFiles = true)
+    void Open(bool withHeader, bool memFiles = true, const std::string& library = HARBOR_SIM_DIR)
     {
         const std::filesystem::path settings = dir_ / "harbor.ini";
         std::ofstream out(settings, std::ios::trunc);
-        out << "[PATHS]\nDLL=" << HARBOR_SIM_DIR << "/\n";
+        out << "[PATHS]\nDLL=" << library << "/\n";
         out << "HEADERS=" << HARBOR_INCLUDE_DIR << "/\n";
         out << "TEMP=" << dir_.string() << "/\n";
         out << "[DEBUG]\nMEMFILES=" << (memFiles ? "TRUE" : "FALSE") << "\n";
@@ -60,7 +60,7 @@ protected:
             out << "[HEADERS]\nMLT=Onyx2MLT.h\n";
         out.close();
         session_ = std::make_unique<BrickSession>(settings.string().c_str());
-        ASSERT_TRUE(session_->libraryLoaded());
+        ASSERT_EQ(session_->libraryLoaded(), library == HARBOR_SIM_DIR);
     }
 
     std::int32_t Run(std::string& text, ErrorSink& sink)
@@ -106,6 +106,17 @@ TEST_F(SimMacroToCsv, MissingHeaderIsATranslationError)
     EXPECT_LT(code, 0);
     EXPECT_EQ(result, nullptr);
     EXPECT_NE(std::string(sink.GetText()), "");
+}
+
+TEST_F(SimMacroToCsv, WithoutTheLibraryTheLinkFailureComesBack)
+{
+    ASSERT_NO_FATAL_FAILURE(Open(true, true, (dir_ / "nowhere").string()));
+    ErrorSink sink;
+    ReaderWriter* result = nullptr;
+    EXPECT_EQ(
+        tools::MacroToCsv(*session_, tessel::BrickOnyx2, kMacroCall, "Onyx2MLT.h", &result, &sink),
+        static_cast<std::int32_t>(tessel::kLinkFailed));
+    EXPECT_EQ(result, nullptr);
 }
 
 class SimConvert : public commands_test::DialogFixture {};
