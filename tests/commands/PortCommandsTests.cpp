@@ -199,6 +199,20 @@ INSTANTIATE_TEST_SUITE_P(PortCommands, BrickNames,
                                            BrickName{"onyx", "Onyx brick"},
                                            BrickName{"minirover", "MiniRover brick"}));
 
+TEST_F(PortCommands, ATowerRefusingStatisticsStopsTheOpenedSteps)
+{
+    ASSERT_NO_FATAL_FAILURE(
+        Start(std::string(kFastLink) + "[brick b1]\n[port COM1]\nstatistics = refused\n"));
+    Click(ui::IdOpenPort);
+
+    EXPECT_EQ(LastStatus(), "Collect statistics failed");
+    EXPECT_TRUE(Offers().empty());
+    // The handle stays open; only the brick was not looked for.
+    EXPECT_NE(dialog().brickHandle(), 0);
+    Click(ui::IdStatistics);
+    EXPECT_EQ(LastStatus(), "No statistics");
+}
+
 TEST_F(PortCommands, CloseTwiceSaysClosedThenNotOpen)
 {
     ASSERT_NO_FATAL_FAILURE(StartSerial());
