@@ -21,6 +21,11 @@ int HeadlessHelpViewer::OpenFile(ui::WindowHandle owner, const char* file)
     if (file == nullptr || file[0] == '\0') {
         return 0;
     }
+    if (open_ && owner != owner_) {
+        // Another run takes the viewer over; the earlier one ends when the viewer closes.
+        Command(kCloseCommand, 0);
+        open_ = false;
+    }
     const std::string path =
         std::strchr(file, '/') != nullptr ? std::string(file) : helpDirectory_ + file;
     if (!document_.Load(path)) {
@@ -38,10 +43,9 @@ int HeadlessHelpViewer::OpenFile(ui::WindowHandle owner, const char* file)
 int HeadlessHelpViewer::RunMacro(ui::WindowHandle owner, const char* file, const char* macro)
 {
     std::string topic;
-    if (!open_ || !HelpDocument::ParseJumpMacro(macro, nullptr, &topic)) {
+    if (!open_ || owner != owner_ || !HelpDocument::ParseJumpMacro(macro, nullptr, &topic)) {
         return 0;
     }
-    owner_ = owner;
     return ShowTopic(topic) ? 1 : 0;
 }
 
@@ -64,7 +68,7 @@ bool HeadlessHelpViewer::ShowTopic(const std::string& id)
 
 int HeadlessHelpViewer::Quit(ui::WindowHandle owner, const char* file)
 {
-    if (open_) {
+    if (open_ && owner == owner_) {
         open_ = false;
         currentTopic_.clear();
         Print("closed");

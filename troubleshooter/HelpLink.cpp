@@ -131,7 +131,9 @@ void HelpLink::CloseHelp()
 
 bool HelpLink::ShowOutcome(int outcome)
 {
-    if (!helpOpen_ && WinHelp(kHelpForceFile, nullptr) == 1) {
+    // Without its window the help's commands, its close command included, could reach
+    // nothing, and the run would wait for ever: such a help is never opened.
+    if (!helpOpen_ && window() != ui::kNoWindow && WinHelp(kHelpForceFile, nullptr) == 1) {
         helpOpen_ = true;
     }
     const char* topic = TopicOf(outcome);

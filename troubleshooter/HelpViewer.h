@@ -5,6 +5,11 @@
 // (ui::kMsgCommand, wParam = the command id, lParam = its argument) to the owner window of
 // the calls, the hidden "trbl_wnd" window of the run's HelpLink; closing the viewer sends
 // command 2000. The Qt host implements it with a viewer window; HeadlessHelpViewer prints.
+//
+// One viewer serves every run, and a run may start while another waits for its help (the
+// dialog stays usable meanwhile). Opening for a new owner therefore takes the viewer over:
+// the old owner is sent 2000, so that its run ends once the new one has, and a later Quit
+// or macro of the old owner changes nothing.
 #pragma once
 
 #include "ui/Window.h"

@@ -28,6 +28,7 @@ public:
     bool quit = false;
     int pumps = 0;
     int destroyed = 0;
+    bool refuseWindows = false;
 
     ui::WindowHandle OnlyWindow() const
     {
@@ -41,6 +42,9 @@ public:
     }
     ui::WindowHandle CreatePlainWindow(const char* className, ui::WindowObject* object) override
     {
+        if (refuseWindows) {
+            return ui::kNoWindow;
+        }
         const ui::WindowHandle handle = next_++;
         windows[handle] = {className, object};
         object->AttachWindow(handle);

@@ -214,6 +214,28 @@ TEST_F(HeadlessViewer, EndOfInputClosesTheHelpOnce)
     EXPECT_FALSE(viewer.Command(2002, 0));
 }
 
+TEST_F(HeadlessViewer, ANewOwnerTakesTheViewerOver)
+{
+    const ui::WindowHandle first = Owner();
+    Sink second;
+    const ui::WindowHandle later = host.CreatePlainWindow("trbl_wnd", &second);
+    EXPECT_EQ(viewer.OpenFile(first, "shooter.hlp"), 1);
+    EXPECT_EQ(viewer.OpenFile(later, "shooter.hlp"), 1);
+    host.PumpMessage();
+    ASSERT_EQ(sink.commands.size(), 1u);
+    EXPECT_EQ(sink.commands[0].first, 2000);
+    // The first owner's own close and topics no longer touch the viewer.
+    EXPECT_EQ(viewer.RunMacro(first, "shooter.hlp", "JI(\"shooter.hlp\",\"Onyx_ok\")"), 0);
+    EXPECT_EQ(viewer.Quit(first, "shooter.hlp"), 1);
+    EXPECT_TRUE(viewer.IsOpen());
+    EXPECT_EQ(viewer.RunMacro(later, "shooter.hlp", "JI(\"shooter.hlp\",\"Onyx_ok\")"), 1);
+    EXPECT_TRUE(viewer.Command(2002, 0));
+    host.PumpMessage();
+    EXPECT_EQ(second.commands.size(), 1u);
+    EXPECT_EQ(viewer.Quit(later, "shooter.hlp"), 1);
+    EXPECT_FALSE(viewer.IsOpen());
+}
+
 TEST_F(HeadlessViewer, MissingFileFailsToOpen)
 {
     HeadlessHelpViewer elsewhere(host, nullptr, "/nonexistent/");

@@ -292,6 +292,18 @@ TEST_F(HelpProtocol, MissingHelpFileEndsTheRunAtOnceWithTheDiagnosisLogged)
     EXPECT_NE(log.body().find("\nTrouble Shooter closed\n"), std::string::npos);
 }
 
+TEST_F(HelpProtocol, WithoutItsWindowTheHelpNeverOpens)
+{
+    host.refuseWindows = true;
+    HelpLink link(&shooter, host, &viewer);
+    EXPECT_EQ(link.window(), ui::kNoWindow);
+    EXPECT_TRUE(shooter.Diagnose(Packed(0xE0050421u), &link));
+    EXPECT_FALSE(link.HelpOpen());
+    EXPECT_EQ(host.pumps, 0);
+    EXPECT_EQ(viewer.Macros(), Strings{Jump("IR_Transmitter_or_cable_not_connected")});
+    EXPECT_EQ(viewer.calls.front().rfind("open", 0), std::string::npos);
+}
+
 TEST_F(HelpProtocol, LinkClosesAHelpStillOpenWhenItGoes)
 {
     {

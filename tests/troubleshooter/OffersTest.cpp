@@ -65,6 +65,12 @@ protected:
             }
             const auto link = links.front();
             links.pop_front();
+            if (link.first == kNestedRun) {
+                // The dialog stays usable: another failure offers another run meanwhile.
+                host_->QueueAnswer(true);
+                nestedResult = dialog_->OfferTroubleShooter(link.second);
+                return true;
+            }
             viewer_->Command(link.first, link.second);
             return true;
         });
@@ -102,6 +108,9 @@ protected:
     std::deque<std::pair<int, std::int32_t>> links;
     Strings printed;
     Strings questions;
+    bool nestedResult = false;
+    // A "link" that starts a second run with its argument as the error.
+    static constexpr int kNestedRun = -1;
 };
 
 constexpr char kSerialBench[] = "[brick onyx2]\n[port COM1]\n[port COM3]\n";
@@ -180,6 +189,18 @@ TEST_F(TroubleShooterOffers, EndOfTheHelpInputClosesTheHelp)
     EXPECT_TRUE(dialog().OfferTroubleShooter(Packed(0xE0050402u)));
     EXPECT_EQ(Topics(), (Strings{"Onyx_not_alive", "IR_Transmitter_ok", "Onyx_ok"}));
     EXPECT_EQ(printed.back(), "[help] closed");
+    ExpectRunEndedCleanly();
+}
+
+TEST_F(TroubleShooterOffers, ASecondRunTakesTheHelpOverAndBothEnd)
+{
+    StartDialog(kSerialBench, "Serial=COM1");
+    links = {{kNestedRun, Packed(0xE0050402u)}, {2003, 0}, {2000, 0}};
+    host_->QueueAnswer(true);
+    EXPECT_TRUE(dialog().OfferTroubleShooter(Packed(0xE0050421u)));
+    EXPECT_TRUE(nestedResult);
+    EXPECT_EQ(Topics(),
+              (Strings{"IR_Transmitter_or_cable_not_connected", "Onyx_not_alive", "Onyx_ok"}));
     ExpectRunEndedCleanly();
 }
 
