@@ -154,14 +154,14 @@ Operand ParseValue(std::string_view text, bool destination, std::int32_t offset)
             Fail(kSyntax, offset, text);
         }
         if (destination && !IsWritable(operand.source)) {
-            Fail(17, offset, text);
+            Fail(kWritableExpected, offset, text);
         }
         return operand;
     }
     operand.source = Source::Constant;
     operand.value = static_cast<std::int16_t>(NumberIn(number, -32768, 65535, offset));
     if (destination) {
-        Fail(17, offset, text);
+        Fail(kWritableExpected, offset, text);
     }
     return operand;
 }

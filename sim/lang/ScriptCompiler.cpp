@@ -270,7 +270,7 @@ private:
             syntax(peek());
         }
         if (!haveMain) {
-            Fail(28, close.offset, "main");
+            Fail(kTaskUndefined, close.offset, "main");
         }
         // main first, then the tasks, then the subroutines, each in number order.
         for (int pass = 0; pass < 3; ++pass) {
@@ -339,7 +339,7 @@ private:
                 continue;
             }
             if (local) { // timers, counters, events and semaphores belong to the program
-                Fail(57, name.offset, name.text);
+                Fail(kNotALocal, name.offset, name.text);
             }
             if (kind == "var") {
                 const int index = globalCount_;
@@ -609,7 +609,7 @@ private:
             const Token& name = expectName();
             const Symbol* symbol = lookup(name.text);
             if (symbol == nullptr || symbol->kind != (isEvent ? Sym::Event : Sym::Semaphore)) {
-                Fail(isEvent ? 38 : 48, name.offset, name.text);
+                Fail(isEvent ? kEventNotDeclared : kSemaphoreNotDeclared, name.offset, name.text);
             }
             const Op op = w == "signal"    ? Op::Signal
                           : w == "await"   ? Op::Await
@@ -735,7 +735,7 @@ private:
             dest = {Source::Counter, static_cast<std::int16_t>(symbol->index)};
             break;
         default:
-            Fail(17, name.offset, name.text);
+            Fail(kWritableExpected, name.offset, name.text);
         }
         const Token& op = peek();
         static constexpr struct {
@@ -1346,14 +1346,14 @@ private:
             // get <address>,<count>: a memory read of 1 to 256 bytes.
             const Token& address = peek();
             if (address.kind != Tok::Number) {
-                Fail(139, address.offset, Shown(address));
+                Fail(kBadGet, address.offset, Shown(address));
             }
             take();
             expect(",");
             const Token& count = peek();
             if (count.kind != Tok::Number || count.value < 1 || count.value > 256 ||
                 address.value + count.value > 0x10000) {
-                Fail(139, count.offset, Shown(count));
+                Fail(kBadGet, count.offset, Shown(count));
             }
             take();
             emit(Op::GetMemory, t.offset, {B(address.value), B(count.value)});
