@@ -5,6 +5,7 @@
 #include <string>
 
 #include "FrameFixture.h"
+#include "testlib/TestSupport.h"
 #include "ui/headless/HeadlessRunner.h"
 
 using namespace ui;
@@ -16,9 +17,10 @@ class RunnerTest : public FrameFixture {
 protected:
     // Runs script on a dialog built from settings; keeps the transcript and the messages.
     int Run(const std::string& script, const std::string& settings = "",
-            HeadlessOptions options = {}, const std::string& fileArgument = "")
+            HeadlessOptions options = {}, const std::string& fileArgument = "",
+            const std::string& library = headless_test::SimulatorDirectory())
     {
-        Construct(settings, fileArgument);
+        Construct(settings, fileArgument, library);
         std::istringstream in(script);
         options.fixedTicks = true;
         HeadlessRunner runner(host(), dialog(), in, out, err, options);
@@ -183,4 +185,25 @@ TEST_F(RunnerTest, HelpWithoutASessionIsRefused)
 {
     EXPECT_EQ(Run("Help 2002\n"), HeadlessFailed);
     EXPECT_NE(out.str().find("refused: no help is open"), std::string::npos);
+}
+
+TEST_F(RunnerTest, AnOperationGivenUpOnIsNotWaitedForAgain)
+{
+    if (headless_test::RecordingLibraryDirectory().empty())
+        GTEST_SKIP() << "no testlib";
+    // The recording library accepts the download and never reports back.
+    testsupport::RecordingLibrary library(headless_test::RecordingLibraryDirectory() + "/");
+    ASSERT_TRUE(library.loaded());
+    library.state().results[tessel::SlotCreate] = 3;
+    HeadlessOptions options;
+    options.waitTimeoutMs = 50;
+    EXPECT_EQ(Run("Editor a\nDownload\nEditor b\nEditor c\n", "[PORTS]\nUSB=T\n", options, "",
+                  headless_test::RecordingLibraryDirectory()),
+              HeadlessFailed);
+    const std::string text = out.str();
+    const auto first = text.find("wait: timed out");
+    ASSERT_NE(first, std::string::npos) << text;
+    EXPECT_EQ(text.find("wait: timed out", first + 1), std::string::npos) << text;
+    EXPECT_LT(first, text.find("> Editor b"));
+    Stop();
 }

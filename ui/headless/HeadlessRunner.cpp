@@ -323,12 +323,18 @@ void HeadlessRunner::waitForOperations(int timeoutMs)
     const std::int64_t deadline = NowMs() + timeoutMs;
     for (;;) {
         host_.DispatchPending();
-        if (dialog_.operationsInFlight() == 0 || host_.QuitRequested())
+        const int inFlight = dialog_.operationsInFlight();
+        // A late report of an operation given up on lowers the count below the mark.
+        if (abandoned_ > inFlight)
+            abandoned_ = inFlight;
+        if (inFlight <= abandoned_ || host_.QuitRequested())
             return;
         const std::int64_t left = deadline - NowMs();
         if (left <= 0) {
+            // Given up: later commands do not wait for it again.
             print("wait: timed out");
             commandFailed_ = true;
+            abandoned_ = inFlight;
             return;
         }
         host_.WaitForMessage(static_cast<int>(left));

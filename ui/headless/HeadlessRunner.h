@@ -88,6 +88,8 @@ private:
     bool inputEnded_ = false;
     bool helpCloseSent_ = false;
     bool exitSent_ = false;
+    // Operations in flight that a timed-out wait gave up on.
+    int abandoned_ = 0;
     // Shows the Trouble Shooter's help topics as lines and carries the Help commands.
     std::unique_ptr<HeadlessHelpViewer> helpViewer_;
 };
