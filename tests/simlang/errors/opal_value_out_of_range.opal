@@ -1,0 +1,2 @@
+; expect error 129 at "300": 300
+sound 300
