@@ -9,7 +9,8 @@
 //   307,<offset>                 a jump lands on the next command (code offset in the block)
 //   231,<s>,<v>,<mnemonic>[,<plain operands>]          a command with one value operand
 //   233,<s1>,<v1>,<s2>,<v2>,<mnemonic>[,<plain operands>]  a command with two
-//   <opcode>,<mnemonic>[,<plain operands>]              a command without value operands
+//   <opcode>,<mnemonic>[,<plain operands>]              a command without value operands,
+//                                                       under its opcode byte in decimal
 //   407                          the block ends
 //
 // A value operand is written as its source and value, except that an operand naming a
