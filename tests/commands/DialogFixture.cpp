@@ -71,7 +71,11 @@ void DialogFixture::Start(const std::string& scenario, const std::string& ports,
 
     host_ = std::make_unique<ui::HeadlessHost>();
     host_->FixTickCount(1000);
-    host_->SetListener([this](const ui::HeadlessEvent& event) { events_.push_back(event); });
+    host_->SetListener([this](const ui::HeadlessEvent& event) {
+        events_.push_back(event);
+        if (extra_)
+            extra_(event);
+    });
 
     std::string commandLine = "\"" + (dir_ / "harbor.exe").string() + "\"";
     if (!fileArgument.empty())
@@ -89,6 +93,7 @@ void DialogFixture::Stop(bool settle)
             Settle();
         dialog_.reset();
     }
+    extra_ = nullptr;
     host_.reset();
 }
 

@@ -9,6 +9,7 @@
 #include <gtest/gtest.h>
 
 #include <filesystem>
+#include <functional>
 #include <memory>
 #include <string>
 #include <vector>
@@ -65,6 +66,8 @@ protected:
     // Questions of the Trouble Shooter offers ("Diagnostics").
     std::vector<std::string> Offers() const;
     void ClearEvents() { events_.clear(); }
+    // Also called with every event, after it is recorded; null removes it.
+    void OnEvent(std::function<void(const ui::HeadlessEvent&)> extra) { extra_ = std::move(extra); }
 
     std::string WriteFile(const std::string& name, const std::string& bytes);
     static std::string ReadFile(const std::filesystem::path& path);
@@ -77,6 +80,7 @@ private:
     std::unique_ptr<ui::HeadlessHost> host_;
     std::unique_ptr<ui::TestClientDialog> dialog_;
     std::vector<ui::HeadlessEvent> events_;
+    std::function<void(const ui::HeadlessEvent&)> extra_;
 };
 
 } // namespace commands_test

@@ -99,16 +99,16 @@ TEST_F(PortCommands, APortTakenBetweenSearchAndOpenShowsCreateFailed)
     // While the user is asked about COM1, another handle takes it.
     ui::TestClientDialog* target = &dialog();
     tessel::Long thief = 0;
-    host().SetListener([target, &thief](const HeadlessEvent& event) {
+    OnEvent([target, &thief](const HeadlessEvent& event) {
         if (event.kind == HeadlessEvent::Kind::Question && event.text == "COM1" && thief == 0)
             thief = target->session()->Create("COM1");
     });
     host().QueueAnswer(true);
     Click(ui::IdOpenPort);
-    host().SetListener(nullptr);
+    OnEvent(nullptr);
 
     ASSERT_NE(thief, 0);
-    EXPECT_EQ(Text(ui::IdStatusBox), "Create failed");
+    EXPECT_EQ(LastStatus(), "Create failed");
     EXPECT_EQ(dialog().brickHandle(), 0);
     dialog().session()->Destroy(thief);
 }

@@ -241,6 +241,192 @@ TEST_F(ScriptCommands, DownloadFileOfAMissingFileShowsTheErrorAndLeavesTheCaret)
     EXPECT_EQ(end, 5);
 }
 
+constexpr const char* kGoodProgram = "program P {\n    main {\n        sound 4\n    }\n}\n";
+
+TEST_F(ScriptCommands, ValidateOfAGoodScriptSaysOk)
+{
+    ASSERT_NO_FATAL_FAILURE(StartOpen());
+    SetText(ui::IdEditor, kGoodProgram);
+    SelectSource(ui::SourceListRaw); // validation reads a script whatever the list shows
+    Click(ui::IdValidate);
+    EXPECT_EQ(Statuses(), (std::vector<std::string>{"", "OK"}));
+    EXPECT_EQ(host().FocusedControl(window()), ui::IdEditor);
+}
+
+TEST_F(ScriptCommands, ValidateNeedsNoPort)
+{
+    ASSERT_NO_FATAL_FAILURE(Start(std::string(kFastLink) + "[brick b1]\n[port COM1]\n"));
+    SetText(ui::IdEditor, kGoodProgram);
+    Click(ui::IdValidate);
+    EXPECT_EQ(LastStatus(), "OK");
+}
+
+TEST_F(ScriptCommands, AValidationErrorPlacesTheCaretAndNamesTheErrorWithoutAnOffer)
+{
+    ASSERT_NO_FATAL_FAILURE(StartOpen());
+    const std::string script = "program P {\n    main {\n        speed = 1\n    }\n}\n";
+    SetText(ui::IdEditor, script);
+    Click(ui::IdValidate);
+
+    // Code 16 takes the compiler's detail, the undeclared name, in place of its table text.
+    EXPECT_EQ(LastStatus(), "Error (0xe0050810) from Tessel compiler: speed");
+    std::int32_t start = -1, end = -1;
+    host().GetEditSelection(window(), ui::IdEditor, &start, &end);
+    EXPECT_EQ(start, static_cast<std::int32_t>(script.find("speed")));
+    EXPECT_EQ(end, start);
+    EXPECT_TRUE(Offers().empty());
+}
+
+TEST_F(ScriptCommands, ExecuteOfAnImmediateScriptShowsTheAnswer)
+{
+    ASSERT_NO_FATAL_FAILURE(StartOpen());
+    SetText(ui::IdEditor, "brick version?");
+    Click(ui::IdExecute);
+    EXPECT_EQ(LastStatus(), std::string("Exec result: 0 (") + kVersionAnswer + ")");
+}
+
+TEST_F(ScriptCommands, ATranslationErrorInExecutePlacesTheCaretAndOffersHelp)
+{
+    ASSERT_NO_FATAL_FAILURE(StartOpen());
+    const std::string script = "sound 4\nwait 10\n";
+    SetText(ui::IdEditor, script);
+    Click(ui::IdExecute);
+
+    const std::string text =
+        "Error (0xe0050884) from Tessel compiler: primitive only available in download mode";
+    EXPECT_EQ(LastStatus(), text);
+    std::int32_t start = -1, end = -1;
+    host().GetEditSelection(window(), ui::IdEditor, &start, &end);
+    EXPECT_EQ(start, static_cast<std::int32_t>(script.find("wait")));
+    EXPECT_EQ(Offers(), std::vector<std::string>{text + ".\r\nUse Trouble Shooter?"});
+    EXPECT_EQ(host().FocusedControl(window()), ui::IdEditor);
+}
+
+TEST_F(ScriptCommands, ATranslationErrorInExecuteAsyncMakesNoOffer)
+{
+    ASSERT_NO_FATAL_FAILURE(StartOpen());
+    SetText(ui::IdEditor, "sound 4\nwait 10\n");
+    Click(ui::IdExecuteAsync);
+    Settle();
+    EXPECT_EQ(LastStatus(),
+              "Error (0xe0050884) from Tessel compiler: primitive only available in download mode");
+    EXPECT_TRUE(Offers().empty());
+    EXPECT_EQ(dialog().operationsInFlight(), 0);
+}
+
+TEST_F(ScriptCommands, ATranslationErrorInDownloadPlacesTheCaretAndOffersHelp)
+{
+    ASSERT_NO_FATAL_FAILURE(StartOpen());
+    const std::string script = "program P {\n    main {\n        sound 4\n        speed = 2\n";
+    SetText(ui::IdEditor, script + "    }\n}\n");
+    Click(ui::IdDownload);
+    Settle();
+    EXPECT_EQ(Statuses(),
+              (std::vector<std::string>{"", "Error (0xe0050810) from Tessel compiler: speed"}));
+    std::int32_t start = -1, end = -1;
+    host().GetEditSelection(window(), ui::IdEditor, &start, &end);
+    EXPECT_EQ(start, static_cast<std::int32_t>(script.find("speed")));
+    EXPECT_EQ(Offers().size(), 1u);
+}
+
+TEST_F(ScriptCommands, AutoClearRunsFirstAndAFailureStopsBeforeTranslating)
+{
+    // Every packet to the brick is lost, so clearing it fails; the script is wrong too, but
+    // its error must not appear: nothing is translated after the failed clear.
+    ASSERT_NO_FATAL_FAILURE(StartOpen("loss = 100\n"));
+    SetChecked(ui::IdAutoClear, true);
+    SetText(ui::IdEditor, "program P {\n    main {\n        speed = 2\n    }\n}\n");
+    Click(ui::IdDownload);
+    Settle();
+    EXPECT_EQ(Statuses(),
+              (std::vector<std::string>{"", "Error (0xe1000204) from Wisp: Retry count exceeded"}));
+    EXPECT_EQ(Offers().size(), 1u);
+
+    // Without Auto Clear the same download reaches the translation.
+    ClearEvents();
+    SetChecked(ui::IdAutoClear, false);
+    Click(ui::IdDownload);
+    Settle();
+    EXPECT_EQ(LastStatus(), "Error (0xe0050810) from Tessel compiler: speed");
+}
+
+TEST_F(ScriptCommands, AutoClearOnAHealthyBrickDownloadsAsUsual)
+{
+    ASSERT_NO_FATAL_FAILURE(StartOpen("", "AUTOCLEAR=TRUE"));
+    EXPECT_TRUE(host().IsChecked(window(), ui::IdAutoClear));
+    SetText(ui::IdEditor, kGoodProgram);
+    Click(ui::IdDownload);
+    Settle();
+    EXPECT_EQ(Statuses(), (std::vector<std::string>{"", "Downloading", "Downloaded ok (0 mS)"}));
+}
+
+// main never ends, so the brick's task byte of its first slot and task (0xC8EE) holds the
+// running bit (2) beside the defined bit (1) once main was started.
+constexpr const char* kEndlessProgram =
+    "program P {\n    main {\n        while (1) {\n            wait 100\n        }\n    }\n}\n";
+
+TEST_F(ScriptCommands, AutoRunStartsTheDownloadedProgram)
+{
+    ASSERT_NO_FATAL_FAILURE(StartOpen("", "AUTORUN=TRUE"));
+    EXPECT_TRUE(host().IsChecked(window(), ui::IdAutoRun));
+    SetText(ui::IdEditor, kEndlessProgram);
+    Click(ui::IdDownload);
+    Settle();
+    EXPECT_EQ(LastStatus(), "Downloaded ok (0 mS)");
+    SetText(ui::IdEditor, "get 0xC8EE,1");
+    Click(ui::IdExecute);
+    EXPECT_EQ(LastStatus(), "Exec result: 3 (0x03)");
+}
+
+TEST_F(ScriptCommands, WithoutAutoRunTheProgramStaysStopped)
+{
+    ASSERT_NO_FATAL_FAILURE(StartOpen());
+    SetText(ui::IdEditor, kEndlessProgram);
+    Click(ui::IdDownload);
+    Settle();
+    SetText(ui::IdEditor, "get 0xC8EE,1");
+    Click(ui::IdExecute);
+    EXPECT_EQ(LastStatus(), "Exec result: 1 (0x01)");
+}
+
+TEST_F(ScriptCommands, DownloadFileTranslatesTheNamedScript)
+{
+    ASSERT_NO_FATAL_FAILURE(StartOpen());
+    SetText(ui::IdDownloadFileName, WriteFile("robot.onyx2", kGoodProgram));
+    SetText(ui::IdEditor, "not even looked at");
+    Click(ui::IdDownloadFile);
+    Settle();
+    EXPECT_EQ(Statuses(), (std::vector<std::string>{"Downloading", "Downloaded ok (0 mS)"}));
+}
+
+TEST_F(ScriptCommands, DownloadFileWithTheSourceListOnRawTranslatesOpal)
+{
+    ASSERT_NO_FATAL_FAILURE(StartOpen());
+    SetText(ui::IdDownloadFileName,
+            WriteFile("robot.opal", "task 0\n    sound 4\n    halt\nend\n"));
+    SelectSource(ui::SourceListRaw);
+    Click(ui::IdDownloadFile);
+    Settle();
+    EXPECT_EQ(LastStatus(), "Downloaded ok (0 mS)");
+}
+
+TEST_F(ScriptCommands, ABrokenScriptFileIsShownWithItsDetailAndLeavesTheCaret)
+{
+    ASSERT_NO_FATAL_FAILURE(StartOpen());
+    SetText(ui::IdEditor, "some text in the editor");
+    host().SetEditSelection(window(), ui::IdEditor, 7, 7);
+    SetText(ui::IdDownloadFileName,
+            WriteFile("broken.onyx2", "program P {\n    main {\n        speed = 1\n    }\n}\n"));
+    Click(ui::IdDownloadFile);
+    Settle();
+    EXPECT_EQ(Statuses(),
+              std::vector<std::string>{"Error (0xe0050810) from Tessel compiler: speed"});
+    EXPECT_EQ(Offers().size(), 1u);
+    std::int32_t start = -1, end = -1;
+    host().GetEditSelection(window(), ui::IdEditor, &start, &end);
+    EXPECT_EQ(start, 7);
+}
+
 TEST_F(ScriptCommands, ReceptionShowsEachMessageInTurnUntilSwitchedOff)
 {
     ASSERT_NO_FATAL_FAILURE(Start(

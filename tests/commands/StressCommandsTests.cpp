@@ -2,6 +2,9 @@
 #include <string>
 
 #include "DialogFixture.h"
+#include "session/BrickSession.h"
+#include "tessel/DirEnt.h"
+#include "tessel/ReaderWriter.h"
 
 namespace commands_test {
 namespace {
@@ -80,6 +83,107 @@ TEST_F(StressCommands, AnEmptyEditorStopsTheStepAndKeepsTheIteration)
     Settle();
     EXPECT_EQ(Statuses(), std::vector<std::string>{""});
     EXPECT_EQ(dialog().stressIteration(), 1);
+}
+
+// A program written without its final closing brace, as the stress test expects it.
+constexpr const char* kOpenProgram = "program S {\n    main {\n        sound 4\n    }\n";
+
+// The source working file as the library last read it.
+std::string SourceFileText(ui::TestClientDialog& dialog)
+{
+    std::string text;
+    ReaderWriter* file = dialog.session()->sourceEntry()->open(tessel::FileScript);
+    if (file == nullptr)
+        return text;
+    if (file->openRead().packedCode() == RwOk.packedCode()) {
+        text.resize(static_cast<std::size_t>(file->size()));
+        text.resize(static_cast<std::size_t>(file->read(text.data(), file->size())));
+        file->close();
+    }
+    BrickSession::ReleaseReaderWriter(&file);
+    return text;
+}
+
+TEST_F(StressCommands, ThreeIterationsCarryOneMoreSpaceEachAndThenPass)
+{
+    ASSERT_NO_FATAL_FAILURE(StartOpen());
+    SetText(ui::IdEditor, kOpenProgram);
+    SetText(ui::IdStressCount, "3");
+    // When an iteration is announced, its text has just been translated.
+    std::vector<std::string> sent;
+    ui::TestClientDialog* target = &dialog();
+    OnEvent([target, &sent](const HeadlessEvent& event) {
+        if (event.kind == HeadlessEvent::Kind::Status && event.text.rfind("Stress test #", 0) == 0)
+            sent.push_back(SourceFileText(*target));
+    });
+    Click(ui::IdStress);
+    Settle();
+    OnEvent(nullptr);
+
+    ASSERT_EQ(sent.size(), 3u);
+    for (std::size_t i = 0; i < sent.size(); ++i) {
+        EXPECT_EQ(sent[i], kOpenProgram + std::string(201 + i, ' ') + "}") << "iteration " << i + 1;
+    }
+    EXPECT_EQ(Statuses(),
+              (std::vector<std::string>{"", "Downloading", "Stress test #1", "Downloaded ok (0 mS)",
+                                        "Downloading", "Stress test #2", "Downloaded ok (0 mS)",
+                                        "Downloading", "Stress test #3", "Downloaded ok (0 mS)",
+                                        "Stress test passed ok"}));
+    EXPECT_EQ(dialog().stressIteration(), 0);
+}
+
+TEST_F(StressCommands, TheCountIsReadAgainAtEveryStep)
+{
+    ASSERT_NO_FATAL_FAILURE(StartOpen());
+    SetText(ui::IdEditor, kOpenProgram);
+    SetText(ui::IdStressCount, "100");
+    Click(ui::IdStress); // iteration 1 is on its way
+    SetText(ui::IdStressCount, "2");
+    Settle();
+    EXPECT_EQ(LastStatus(), "Stress test passed ok");
+    std::size_t announced = 0;
+    for (const std::string& text : Statuses())
+        announced += text.rfind("Stress test #", 0) == 0 ? 1 : 0;
+    EXPECT_EQ(announced, 2u);
+}
+
+TEST_F(StressCommands, ADownloadThatCannotStartEndsTheTestAndKeepsItsReason)
+{
+    // Program memory too small for any program.
+    ASSERT_NO_FATAL_FAILURE(
+        Start(std::string(kFastLink) + "[brick b1]\nmemory = 0\n[port COM1]\n", "Serial=COM1"));
+    ClearEvents();
+    SetText(ui::IdEditor, kOpenProgram);
+    Click(ui::IdStress);
+    Settle();
+
+    const std::string full =
+        "Error (0xe005040e) from Tessel driver: not enough memory for task/sub";
+    EXPECT_EQ(LastStatus(), full);
+    EXPECT_EQ(Offers(), std::vector<std::string>{full + ".\r\nUse Trouble Shooter?"});
+    EXPECT_EQ(dialog().stressIteration(), 0);
+}
+
+TEST_F(StressCommands, ADownloadThatBreaksOffStallsTheTestUntilTheUserDownloads)
+{
+    ASSERT_NO_FATAL_FAILURE(
+        Start(std::string(kFastLink) + "[brick b1]\n[port KIVOTOWER1]\nunplug-after = 3\n",
+              "USB=KIVOTOWER1"));
+    ASSERT_GE(dialog().session()->Set(dialog().brickHandle(), tessel::PropDownloadBlockSize, 2), 0);
+    ClearEvents();
+    SetText(ui::IdEditor, "program S {\n    main {\n        sound 1\n        sound 2\n"
+                          "        sound 3\n        sound 4\n        sound 5\n    }\n");
+    Click(ui::IdStress);
+    Settle();
+
+    EXPECT_EQ(
+        LastStatus(),
+        "Error (0xe0050474) from Tessel driver: Kivo USB Tower has been unplugged from this port");
+    EXPECT_EQ(dialog().stressIteration(), 1);
+    // A download of the user's own is no stress iteration: the stalled test ends.
+    Click(ui::IdDownload);
+    EXPECT_EQ(dialog().stressIteration(), 0);
+    Settle();
 }
 
 TEST_F(StressCommands, AboutShowsTwoLinesAndChangesNothing)
