@@ -565,21 +565,29 @@ private:
             emit(Op::Jump, t.offset, {L(top)});
             bind(done);
         } else if (w == "if") {
-            expect("(");
-            const int test = expression();
-            expect(")");
-            const int otherwise = newLabel();
-            condition(test, otherwise);
-            statement(depth + 1);
-            if (acceptWord("else")) {
-                const int done = newLabel();
+            // An else-if chain is walked here rather than nested, so a long chain of cases
+            // does not count as deep nesting.
+            const int done = newLabel();
+            for (;;) {
+                expect("(");
+                const int test = expression();
+                expect(")");
+                const int otherwise = newLabel();
+                condition(test, otherwise);
+                statement(depth + 1);
+                if (!acceptWord("else")) {
+                    bind(otherwise);
+                    break;
+                }
                 emit(Op::Jump, t.offset, {L(done)});
                 bind(otherwise);
-                statement(depth + 1);
-                bind(done);
-            } else {
-                bind(otherwise);
+                if (!acceptWord("if")) {
+                    statement(depth + 1);
+                    break;
+                }
+                nodes_.clear();
             }
+            bind(done);
         } else if (w == "sound") {
             const int sound = constantIn(0, 255);
             emit(Op::PlaySound, t.offset, {B(sound)});
