@@ -558,3 +558,28 @@ TEST_F(RecordingFrame, ObjectWithoutCommandsIsNotDownloaded)
     EXPECT_EQ(state().calls[tessel::SlotDownload].count, 0);
     EXPECT_EQ(dialog().operationsInFlight(), 0);
 }
+
+TEST_F(RecordingFrame, TraceOptionReachesTheLibraryAndWritesTheHeader)
+{
+    const auto old = std::filesystem::current_path();
+    std::filesystem::current_path(scratch().path());
+    Construct("[DEBUG]\nTRACE=65539\n", "", headless_test::RecordingLibraryDirectory());
+    std::filesystem::current_path(old);
+    // Only the low 16 bits count.
+    EXPECT_EQ(dialog().traceOptions(), 3);
+    ASSERT_EQ(state().calls[tessel::SlotSet].count, 1);
+    EXPECT_EQ(state().calls[tessel::SlotSet].numbers[0], 0);
+    EXPECT_EQ(state().calls[tessel::SlotSet].numbers[1], tessel::PropTrace);
+    EXPECT_EQ(state().calls[tessel::SlotSet].numbers[2], 3);
+    std::ifstream trace(scratch().path() / "tsltrace.txt", std::ios::binary);
+    const std::string header((std::istreambuf_iterator<char>(trace)),
+                             std::istreambuf_iterator<char>());
+    EXPECT_EQ(header, "Trace file \"tsltrace.txt\", options: 3\n\n");
+}
+
+TEST_F(RecordingFrame, NoTraceOptionCallsNothing)
+{
+    Construct("", "", headless_test::RecordingLibraryDirectory());
+    EXPECT_EQ(dialog().traceOptions(), 0);
+    EXPECT_EQ(state().calls[tessel::SlotSet].count, 0);
+}
