@@ -53,14 +53,19 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size
         }
         Check(tools::ParseByteList(nullptr, out.data(), max) == 0);
 
-        // Field by field to the end: each call takes at least one byte until none is left.
+        // Field by field to the end: a call that takes no byte means the readable text is used
+        // up (a text file ends at a Ctrl-Z, before its size).
         file->open("r");
-        for (std::size_t calls = 0; file->tell() < file->size(); ++calls) {
-            Check(calls <= content.size() * 2 + 2);
+        for (std::size_t calls = 0;; ++calls) {
+            Check(calls <= content.size() + 2);
+            const std::int32_t position = file->tell();
             if ((calls & 1) != 0) {
                 tools::ReadWord(file);
             } else {
                 tools::ReadByteValue(file);
+            }
+            if (file->tell() == position) {
+                break;
             }
         }
         tools::ReadWord(file);

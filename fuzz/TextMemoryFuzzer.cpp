@@ -1,7 +1,8 @@
 // Text and binary handles on one memory block, driven by random reads, writes, seeks, size
 // changes and reopenings, each checked against a plain model of the stored bytes: LF is
 // stored as CR LF, CR LF reads back as LF, a lone CR stays, a Ctrl-Z ends the text with the
-// position left on it, and bytes a file grows by are zeros.
+// position left on it. A block never shrinks its buffer: bytes beyond a shortened length keep
+// what they held and come back when the file grows again; room never used before is zeros.
 #include <cstdint>
 #include <cstdlib>
 #include <cstring>
@@ -28,18 +29,27 @@ void Check(bool condition)
 }
 
 struct Model {
-    std::vector<unsigned char> bytes;
+    std::vector<unsigned char> buffer; // every byte ever held; the file is its first length
+    std::size_t length = 0;
 
-    void resize(std::size_t length) { bytes.resize(length, 0); }
+    std::size_t size() const { return length; }
 
-    // Stores at position, growing with zeros; returns the new position.
+    void resize(std::size_t newLength)
+    {
+        if (newLength > buffer.size()) {
+            buffer.resize(newLength, 0);
+        }
+        length = newLength;
+    }
+
+    // Stores at position, growing as needed; returns the new position.
     std::int32_t store(std::int32_t position, const std::vector<unsigned char>& data)
     {
-        std::size_t at = static_cast<std::size_t>(position);
-        if (at + data.size() > bytes.size()) {
+        const auto at = static_cast<std::size_t>(position);
+        if (at + data.size() > length) {
             resize(at + data.size());
         }
-        std::memcpy(bytes.data() + at, data.data(), data.size());
+        std::memcpy(buffer.data() + at, data.data(), data.size());
         return static_cast<std::int32_t>(at + data.size());
     }
 
@@ -50,13 +60,13 @@ struct Model {
             return out;
         }
         auto at = static_cast<std::size_t>(position);
-        while (static_cast<std::int32_t>(out.size()) < count && at < bytes.size()) {
-            const unsigned char c = bytes[at];
+        while (static_cast<std::int32_t>(out.size()) < count && at < length) {
+            const unsigned char c = buffer[at];
             if (c == kCtrlZ) {
                 break;
             }
             ++at;
-            if (c == kCr && at < bytes.size() && bytes[at] == kLf) {
+            if (c == kCr && at < length && buffer[at] == kLf) {
                 ++at;
                 out += static_cast<char>(kLf);
             } else {
@@ -84,7 +94,7 @@ std::vector<unsigned char> Payload(fuzz::Input& input)
 void Step(fuzz::Input& input, Model& model, Handle& h)
 {
     ReaderWriter* rw = h.rw;
-    const auto size = static_cast<std::int32_t>(model.bytes.size());
+    const auto size = static_cast<std::int32_t>(model.size());
     switch (input.byte() % 9) {
     case 0: { // write
         const std::vector<unsigned char> data = Payload(input);
@@ -115,7 +125,7 @@ void Step(fuzz::Input& input, Model& model, Handle& h)
             const std::int32_t available = h.position < size ? size - h.position : 0;
             const std::int32_t expected = count < available ? count : available;
             Check(n == expected);
-            Check(n == 0 || std::memcmp(buffer.data(), model.bytes.data() + h.position,
+            Check(n == 0 || std::memcmp(buffer.data(), model.buffer.data() + h.position,
                                         static_cast<std::size_t>(n)) == 0);
             h.position += n;
         }
@@ -158,7 +168,7 @@ void Step(fuzz::Input& input, Model& model, Handle& h)
         if (write && !append) {
             model.resize(0);
         }
-        h.position = append ? static_cast<std::int32_t>(model.bytes.size()) : 0;
+        h.position = append ? static_cast<std::int32_t>(model.size()) : 0;
         break;
     }
     case 6:
@@ -173,7 +183,7 @@ void Step(fuzz::Input& input, Model& model, Handle& h)
         break;
     }
     Check(rw->tell() == h.position);
-    Check(rw->size() == static_cast<std::int32_t>(model.bytes.size()));
+    Check(rw->size() == static_cast<std::int32_t>(model.size()));
 }
 
 } // namespace
