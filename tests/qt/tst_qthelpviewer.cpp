@@ -2,6 +2,7 @@
 // macro, sends command links to the Trouble Shooter's hidden window and counts its closing
 // as the close command; and a whole Trouble Shooter run in which following a command link
 // of the shown topic opens the next topic.
+#include <QAction>
 #include <QSignalSpy>
 #include <QTest>
 #include <QTextBlock>
@@ -15,6 +16,7 @@
 #include "Support.h"
 #include "session/BrickSession.h"
 #include "ui/TestClientDialog.h"
+#include "ui/qt/DialogWindow.h"
 #include "ui/qt/QtHelpViewer.h"
 #include "ui/qt/QtHost.h"
 #include "workspace/LiveObjects.h"
@@ -74,6 +76,8 @@ private slots:
     void closingTheWindowSendsCloseOnce();
     void quitSendsNothing();
     void troubleShooterRunFollowsLinks();
+    void exitDuringARunWaitsForTheRunToEnd_data();
+    void exitDuringARunWaitsForTheRunToEnd();
 };
 
 void tst_QtHelpViewer::openFile_data()
@@ -277,6 +281,48 @@ void tst_QtHelpViewer::troubleShooterRunFollowsLinks()
     QCOMPARE(topics[1], QStringLiteral("IR_Transmitter_ok"));
     QCOMPARE(topics[2], QStringLiteral("Onyx_ok"));
     QCOMPARE(workspace::LiveObjectCount(), std::int64_t(0));
+}
+
+void tst_QtHelpViewer::exitDuringARunWaitsForTheRunToEnd_data()
+{
+    QTest::addColumn<bool>("closeBox");
+    QTest::newRow("close box") << true;
+    QTest::newRow("File Exit") << false;
+}
+
+void tst_QtHelpViewer::exitDuringARunWaitsForTheRunToEnd()
+{
+    QFETCH(bool, closeBox);
+    qt_test::SimFolder folder(qt_test::ShippedTestScenario(), "USB=KIVOTOWER1\n");
+    qt_test::ScriptedAnswerer answerer;
+    ui::QtHost host(kHelpDirectory);
+    host.SetAnswerer(&answerer);
+    ui::TestClientDialog dialog(host, folder.commandLine().c_str());
+    QVERIFY(dialog.Create());
+    ui::DialogWindow* window = host.dialogWindow(dialog.handle());
+    QtHelpViewer& viewer = host.helpViewer();
+    bool sessionDuringRun = true;
+    // While the help waits, the user closes the program.
+    connect(&viewer, &QtHelpViewer::topicShown, this, [&] {
+        QTimer::singleShot(0, this, [&] {
+            if (closeBox)
+                window->close();
+            else
+                window->menuAction(ui::IdFileExit)->trigger();
+            sessionDuringRun = dialog.session() != nullptr;
+        });
+    });
+    answerer.QueueAnswer(true);
+    QVERIFY(dialog.OfferTroubleShooter(static_cast<std::int32_t>(0xE0050421u)));
+    // The help closed as by its close command and the run ended with the session intact.
+    QVERIFY(sessionDuringRun);
+    QVERIFY(!viewer.IsOpen());
+    QVERIFY(dialog.session() != nullptr);
+    QVERIFY(dialog.handle() != ui::kNoWindow);
+    // The exit then goes ahead.
+    QCOMPARE(host.RunMessageLoop(), 0);
+    QCOMPARE(dialog.handle(), ui::kNoWindow);
+    QVERIFY(dialog.session() == nullptr);
 }
 
 QTEST_MAIN(tst_QtHelpViewer)

@@ -128,6 +128,14 @@ void QtHelpViewer::FollowLink(const QUrl& link)
         showTopic(link.fragment());
 }
 
+void QtHelpViewer::CloseByUser()
+{
+    if (window_ && window_->isVisible())
+        window_->close();
+    else
+        windowClosed();
+}
+
 void QtHelpViewer::windowClosed()
 {
     if (!open_ || closing_)

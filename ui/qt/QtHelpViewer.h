@@ -42,6 +42,9 @@ public:
     QWidget* window() const;
     QTextBrowser* browser() const;
 
+    // Closes the window as the user would: the close command goes to the client once.
+    void CloseByUser();
+
     // What a click on a link of the shown topic does.
     void FollowLink(const QUrl& link);
 

@@ -19,6 +19,7 @@
 #include <chrono>
 #include <cstring>
 
+#include "troubleshooter/HelpLink.h"
 #include "ui/TestClientDialog.h"
 #include "ui/qt/Answerer.h"
 #include "ui/qt/DialogWindow.h"
@@ -176,9 +177,8 @@ WindowHandle QtHost::CreateDialogWindow(const DialogTemplate& layout, WindowObje
     Window& window = windows_[handle];
     window.object = object;
     window.dialog = new DialogWindow(layout);
-    QObject::connect(
-        window.dialog.data(), &DialogWindow::commandIssued, receiver_.get(),
-        [this, handle](int id) { SendMessage(handle, kMsgCommand, MakeCommand(id), 0); });
+    QObject::connect(window.dialog.data(), &DialogWindow::commandIssued, receiver_.get(),
+                     [this, handle](int id) { onDialogCommand(handle, id); });
     {
         std::lock_guard<std::mutex> lock(mutex_);
         live_.insert(handle);
@@ -193,6 +193,20 @@ WindowHandle QtHost::CreateDialogWindow(const DialogTemplate& layout, WindowObje
     }
     SendMessage(handle, kMsgInitDialog, 0, 0);
     return handle;
+}
+
+void QtHost::onDialogCommand(WindowHandle dialog, int id)
+{
+    // Closing the program while a Trouble Shooter run waits for its help would pull the
+    // session from under the run. The help closes first, as its own close command; the
+    // exit follows once the run is over and its window is gone.
+    if ((id == kIdCancel || id == IdFileExit) &&
+        FindWindowOfClass(HelpLink::kWindowClass) != kNoWindow && helpViewer_->IsOpen()) {
+        pendingExit_ = {dialog, id};
+        helpViewer_->CloseByUser();
+        return;
+    }
+    SendMessage(dialog, kMsgCommand, MakeCommand(id), 0);
 }
 
 WindowHandle QtHost::CreatePlainWindow(const char* className, WindowObject* object)
@@ -268,8 +282,15 @@ void QtHost::DestroyWindow(WindowHandle window)
             dialog->deleteLater();
             doomed_.emplace_back(dialog);
         }
+        const bool helpWindow =
+            !w->plain.isNull() && w->plain->objectName() == QLatin1String(HelpLink::kWindowClass);
         delete w->plain.data();
         windows_.erase(window);
+        if (helpWindow && pendingExit_.dialog != kNoWindow) {
+            // The run is over: the exit the user asked for goes ahead from the event loop.
+            PostMessage(pendingExit_.dialog, kMsgCommand, MakeCommand(pendingExit_.id), 0);
+            pendingExit_ = {};
+        }
     }
 }
 

@@ -130,6 +130,8 @@ private:
     QWidget* ownerWidget(WindowHandle owner) const;
     bool chooseFile(const FileDialogRequest& request, bool save);
 
+    // A command of a dialog's control or menu.
+    void onDialogCommand(WindowHandle dialog, int id);
     // On the loop's thread, for each wake-up event and for the quit event.
     void dispatchNext();
     void endLoops();
@@ -154,6 +156,12 @@ private:
     WindowHandle nextHandle_ = 1;
     // The loops RunMessageLoop is running, innermost last.
     std::vector<QEventLoop*> loops_;
+    // An exit asked for while a Trouble Shooter run waited for its help: sent when the run's
+    // window goes.
+    struct PendingExit {
+        WindowHandle dialog = kNoWindow;
+        int id = 0;
+    } pendingExit_;
     // Windows whose widgets wait for deletion until control is back in the event loop.
     std::vector<QPointer<QObject>> doomed_;
 };

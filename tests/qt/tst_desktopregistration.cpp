@@ -1,0 +1,260 @@
+// RegServer and UnregServer: the desktop entry and the "*.onyx2" MIME type installed into a
+// temporary data folder and removed again, through the class and through the program.
+#include <QDir>
+#include <QFile>
+#include <QFileInfo>
+#include <QProcess>
+#include <QStandardPaths>
+#include <QTemporaryDir>
+#include <QTest>
+
+#include <cstdlib>
+
+#include "app/DesktopFiles.h"
+#include "app/Registration.h"
+
+using app::DesktopRegistration;
+
+namespace {
+
+QString ReadText(const QString& path)
+{
+    QFile file(path);
+    if (!file.open(QIODevice::ReadOnly))
+        return QString();
+    return QString::fromUtf8(file.readAll());
+}
+
+QString LineStarting(const QString& text, const QString& key)
+{
+    for (const QString& line : text.split(QLatin1Char('\n'))) {
+        if (line.startsWith(key))
+            return line;
+    }
+    return QString();
+}
+
+// Sets or unsets an environment variable for the scope of a test.
+class ScopedEnv {
+public:
+    ScopedEnv(const char* name, const char* value) : name_(name)
+    {
+        const char* old = std::getenv(name);
+        had_ = old != nullptr;
+        if (had_)
+            old_ = old;
+        if (value != nullptr)
+            ::setenv(name, value, 1);
+        else
+            ::unsetenv(name);
+    }
+    ~ScopedEnv()
+    {
+        if (had_)
+            ::setenv(name_, old_.c_str(), 1);
+        else
+            ::unsetenv(name_);
+    }
+
+private:
+    const char* name_;
+    bool had_ = false;
+    std::string old_;
+};
+
+} // namespace
+
+class tst_DesktopRegistration : public QObject {
+    Q_OBJECT
+
+private slots:
+    void registerWritesEntryAndMimeType();
+    void execLine_data();
+    void execLine();
+    void pathThatCannotBeWritten_data();
+    void pathThatCannotBeWritten();
+    void unregisterRemovesBoth();
+    void registerFailsWhereNothingCanBeWritten();
+    void userDataHome_data();
+    void userDataHome();
+    void programSwitchesRegisterAndRemove();
+};
+
+void tst_DesktopRegistration::registerWritesEntryAndMimeType()
+{
+    QTemporaryDir data;
+    const DesktopRegistration registration(data.path().toStdString(), "/opt/harbor/harbor");
+    std::string report;
+    QCOMPARE(registration.Register(report), 0);
+
+    QCOMPARE(QString::fromStdString(registration.desktopEntryPath()),
+             data.filePath("applications/harbor.desktop"));
+    QCOMPARE(QString::fromStdString(registration.mimePackagePath()),
+             data.filePath("mime/packages/harbor-onyx2.xml"));
+    const QString entry = ReadText(data.filePath("applications/harbor.desktop"));
+    QVERIFY(entry.startsWith(QStringLiteral("[Desktop Entry]\n")));
+    QCOMPARE(LineStarting(entry, "Exec="), QStringLiteral("Exec=/opt/harbor/harbor %f"));
+    QCOMPARE(LineStarting(entry, "TryExec="), QStringLiteral("TryExec=/opt/harbor/harbor"));
+    QCOMPARE(LineStarting(entry, "MimeType="), QStringLiteral("MimeType=text/x-onyx2;"));
+    QCOMPARE(LineStarting(entry, "Type="), QStringLiteral("Type=Application"));
+    QVERIFY(!entry.contains(QLatin1Char('@')));
+
+    const QString package = ReadText(data.filePath("mime/packages/harbor-onyx2.xml"));
+    QVERIFY(package.contains(QStringLiteral("<mime-type type=\"text/x-onyx2\">")));
+    QVERIFY(package.contains(QStringLiteral("<glob pattern=\"*.onyx2\"/>")));
+    QCOMPARE(package, ReadText(HARBOR_SOURCE_DIR "/resources/desktop/harbor-onyx2.xml"));
+
+    // One line, naming both files.
+    QVERIFY(report.find('\n') == std::string::npos);
+    QVERIFY(report.find(registration.desktopEntryPath()) != std::string::npos);
+    QVERIFY(report.find(registration.mimePackagePath()) != std::string::npos);
+    // Where the desktop's tool is installed, the MIME database knows the type afterwards.
+    if (!QStandardPaths::findExecutable(QStringLiteral("update-mime-database")).isEmpty()) {
+        QVERIFY(QFileInfo::exists(data.filePath("mime/text/x-onyx2.xml")));
+        QVERIFY(report.find("update-mime-database") != std::string::npos);
+    }
+    // No temporary file is left behind.
+    QCOMPARE(QDir(data.filePath("applications")).entryList(QDir::Files),
+             QStringList({"harbor.desktop"}) +
+                 QDir(data.filePath("applications")).entryList({"*.cache"}, QDir::Files));
+}
+
+void tst_DesktopRegistration::execLine_data()
+{
+    QTest::addColumn<QString>("program");
+    QTest::addColumn<QString>("exec");
+
+    QTest::newRow("plain") << "/usr/lib/harbor/harbor"
+                           << "Exec=/usr/lib/harbor/harbor %f";
+    QTest::newRow("blank") << "/opt/my apps/harbor"
+                           << "Exec=\"/opt/my apps/harbor\" %f";
+    QTest::newRow("dollar") << "/opt/a$b/harbor"
+                            << "Exec=\"/opt/a\\\\$b/harbor\" %f";
+    QTest::newRow("quote") << "/opt/a\"b/harbor"
+                           << "Exec=\"/opt/a\\\\\"b/harbor\" %f";
+    QTest::newRow("backslash") << "/opt/a\\b/harbor"
+                               << "Exec=\"/opt/a\\\\\\\\b/harbor\" %f";
+    QTest::newRow("percent") << "/opt/100%/harbor"
+                             << "Exec=/opt/100%%/harbor %f";
+}
+
+void tst_DesktopRegistration::execLine()
+{
+    QFETCH(QString, program);
+    QFETCH(QString, exec);
+    const QString entry =
+        QString::fromStdString(DesktopRegistration::DesktopEntry(program.toStdString()));
+    QCOMPARE(LineStarting(entry, "Exec="), exec);
+}
+
+void tst_DesktopRegistration::pathThatCannotBeWritten_data()
+{
+    QTest::addColumn<QString>("program");
+    QTest::newRow("relative") << "bin/harbor";
+    QTest::newRow("empty") << "";
+    QTest::newRow("line break") << "/opt/a\nb/harbor";
+}
+
+void tst_DesktopRegistration::pathThatCannotBeWritten()
+{
+    QFETCH(QString, program);
+    QTemporaryDir data;
+    QVERIFY(DesktopRegistration::DesktopEntry(program.toStdString()).empty());
+    const DesktopRegistration registration(data.path().toStdString(), program.toStdString());
+    std::string report;
+    QCOMPARE(registration.Register(report), 1);
+    QVERIFY(report.rfind("RegServer failed", 0) == 0);
+    QVERIFY(!QFileInfo::exists(data.filePath("applications/harbor.desktop")));
+}
+
+void tst_DesktopRegistration::unregisterRemovesBoth()
+{
+    QTemporaryDir data;
+    const DesktopRegistration registration(data.path().toStdString(), "/opt/harbor/harbor");
+    std::string report;
+    QCOMPARE(registration.Register(report), 0);
+    QCOMPARE(registration.Unregister(report), 0);
+    QVERIFY(!QFileInfo::exists(data.filePath("applications/harbor.desktop")));
+    QVERIFY(!QFileInfo::exists(data.filePath("mime/packages/harbor-onyx2.xml")));
+    QVERIFY(report.find(registration.desktopEntryPath()) != std::string::npos);
+    if (!QStandardPaths::findExecutable(QStringLiteral("update-mime-database")).isEmpty())
+        QVERIFY(!QFileInfo::exists(data.filePath("mime/text/x-onyx2.xml")));
+    // A second removal finds nothing and still succeeds.
+    QCOMPARE(registration.Unregister(report), 0);
+    QVERIFY(report.find("nothing to remove") != std::string::npos);
+}
+
+void tst_DesktopRegistration::registerFailsWhereNothingCanBeWritten()
+{
+    QTemporaryDir data;
+    // A file stands where the applications folder should go.
+    QFile blocker(data.filePath("applications"));
+    QVERIFY(blocker.open(QIODevice::WriteOnly));
+    blocker.close();
+    const DesktopRegistration registration(data.path().toStdString(), "/opt/harbor/harbor");
+    std::string report;
+    QCOMPARE(registration.Register(report), 1);
+    QVERIFY2(report.rfind("RegServer failed: cannot make", 0) == 0, report.c_str());
+
+    const DesktopRegistration nowhere("", "/opt/harbor/harbor");
+    QCOMPARE(nowhere.Register(report), 1);
+    QCOMPARE(nowhere.Unregister(report), 1);
+}
+
+void tst_DesktopRegistration::userDataHome_data()
+{
+    QTest::addColumn<QByteArray>("xdg");
+    QTest::addColumn<QByteArray>("home");
+    QTest::addColumn<QString>("expected");
+    QTest::newRow("XDG_DATA_HOME") << QByteArray("/data") << QByteArray("/home/u") << "/data";
+    QTest::newRow("relative XDG_DATA_HOME is ignored")
+        << QByteArray("data") << QByteArray("/home/u") << "/home/u/.local/share";
+    QTest::newRow("HOME only") << QByteArray() << QByteArray("/home/u") << "/home/u/.local/share";
+    QTest::newRow("neither") << QByteArray() << QByteArray() << "";
+}
+
+void tst_DesktopRegistration::userDataHome()
+{
+    QFETCH(QByteArray, xdg);
+    QFETCH(QByteArray, home);
+    QFETCH(QString, expected);
+    const ScopedEnv xdgEnv("XDG_DATA_HOME", xdg.isNull() ? nullptr : xdg.constData());
+    const ScopedEnv homeEnv("HOME", home.isNull() ? nullptr : home.constData());
+    QCOMPARE(QString::fromStdString(DesktopRegistration::UserDataHome()), expected);
+}
+
+void tst_DesktopRegistration::programSwitchesRegisterAndRemove()
+{
+    QTemporaryDir data;
+    QProcessEnvironment environment = QProcessEnvironment::systemEnvironment();
+    environment.insert(QStringLiteral("XDG_DATA_HOME"), data.path());
+    const QString program = QStringLiteral(HARBOR_PROGRAM);
+
+    auto run = [&](const QString& argument, QByteArray* out) {
+        QProcess process;
+        process.setProcessEnvironment(environment);
+        process.start(program, {argument});
+        if (!process.waitForFinished(60000))
+            return -1;
+        *out = process.readAllStandardOutput() + process.readAllStandardError();
+        return process.exitStatus() == QProcess::NormalExit ? process.exitCode() : -1;
+    };
+
+    QByteArray output;
+    QCOMPARE(run(QStringLiteral("/RegServer"), &output), 0);
+    QCOMPARE(output.count('\n'), 1);
+    QVERIFY2(output.startsWith("harbor: registered "), output.constData());
+    const QString entry = ReadText(data.filePath("applications/harbor.desktop"));
+    // The entry starts this very program, wherever it lies.
+    QCOMPARE(LineStarting(entry, "TryExec="), "TryExec=" + QFileInfo(program).canonicalFilePath());
+    QVERIFY(QFileInfo::exists(data.filePath("mime/packages/harbor-onyx2.xml")));
+
+    QCOMPARE(run(QStringLiteral("-unregserver"), &output), 0);
+    QCOMPARE(output.count('\n'), 1);
+    QVERIFY2(output.startsWith("harbor: unregistered: removed "), output.constData());
+    QVERIFY(!QFileInfo::exists(data.filePath("applications/harbor.desktop")));
+    QVERIFY(!QFileInfo::exists(data.filePath("mime/packages/harbor-onyx2.xml")));
+}
+
+QTEST_MAIN(tst_DesktopRegistration)
+#include "tst_desktopregistration.moc"
