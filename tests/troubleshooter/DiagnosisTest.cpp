@@ -490,15 +490,15 @@ INSTANTIATE_TEST_SUITE_P(Others, OutcomeTables,
 
 TEST_F(Diagnosis, JumpLogsUnlistedValuesUnderTheirLabel)
 {
-    Shooter().view();
-    TroubleShooter& s = Shooter();
-    RecordingView v;
-    // Jump needs a view: run a diagnosis without library answers first to store it.
-    s.Diagnose(Packed(0xE0050C52u), &v);
+    // Jump needs the view, which a diagnosis stores.
+    Shooter().Diagnose(Packed(0xE0050C52u), &view);
     const std::size_t before = log.body().size();
-    EXPECT_FALSE(s.Jump(Packed(0xE0051001u)));
+    EXPECT_FALSE(Shooter().Jump(Packed(0xE0051001u)));
+    EXPECT_FALSE(Shooter().Jump(Packed(0xE1000304u)));
     EXPECT_EQ(log.body().substr(before),
-              "\tJump Tessel Module failed:\n\t\tError (0xe0051001) from Tessel unknown module\n");
+              "\tJump Tessel Module failed:\n\t\tError (0xe0051001) from Tessel unknown module\n"
+              "\tJump Wisp failed:\n\t\tError (0xe1000304) from Wisp: unknown\n");
+    EXPECT_EQ(view.shown, std::vector<int>{1002});
 }
 
 } // namespace
