@@ -83,20 +83,20 @@ public:
     {
         const std::size_t start = pos_;
         const unsigned char c = static_cast<unsigned char>(text_[pos_]);
-        Token t;
-        t.offset = where(start);
+        Tok kind = Tok::Punct;
+        const std::int32_t offset = where(start);
         if (!IsScriptByte(c)) {
             char detail[32];
             std::snprintf(detail, sizeof detail, "illegal character 0x%02x", c);
-            Fail(kSyntax, t.offset, detail);
+            Fail(kSyntax, offset, detail);
         }
         if (IsIdentStart(static_cast<char>(c))) {
             while (pos_ < text_.size() && IsIdentChar(text_[pos_])) {
                 ++pos_;
             }
-            t.kind = Tok::Ident;
+            kind = Tok::Ident;
         } else if (std::isdigit(c)) {
-            t.kind = Tok::Number;
+            kind = Tok::Number;
             long value = 0;
             if (c == '0' && (peek(1) == 'x' || peek(1) == 'X') &&
                 std::isxdigit(static_cast<unsigned char>(peek(2)))) {
@@ -124,14 +124,12 @@ public:
                 while (pos_ < text_.size() && IsIdentChar(text_[pos_])) {
                     ++pos_;
                 }
-                Fail(kSyntax, t.offset, text_.substr(start, pos_ - start));
+                Fail(kSyntax, offset, text_.substr(start, pos_ - start));
             }
             if (value > 0xFFFF) {
-                Fail(kOutOfRange, t.offset, text_.substr(start, pos_ - start));
+                Fail(kOutOfRange, offset, text_.substr(start, pos_ - start));
             }
-            t.value = static_cast<std::int32_t>(value);
         } else {
-            t.kind = Tok::Punct;
             std::size_t length = 0;
             for (std::string_view two : kTwoCharPuncts) {
                 if (text_.substr(pos_, 2) == two) {
@@ -144,12 +142,11 @@ public:
                 length = 1;
             }
             if (length == 0) {
-                Fail(kSyntax, t.offset, text_.substr(pos_, 1));
+                Fail(kSyntax, offset, text_.substr(pos_, 1));
             }
             pos_ += length;
         }
-        t.text = text_.substr(start, pos_ - start);
-        return t;
+        return Token::Make(kind, text_.substr(start, pos_ - start), offset);
     }
 
     std::string_view word()
@@ -196,10 +193,7 @@ std::vector<Token> Lexer::run(std::string_view source)
         out.reserve(raw.size() + 16);
         expand(raw.data(), raw.size(), 0, out);
     }
-    Token end;
-    end.kind = Tok::End;
-    end.offset = static_cast<std::int32_t>(source.size());
-    out.push_back(end);
+    out.push_back(Token::Make(Tok::End, {}, static_cast<std::int32_t>(source.size())));
     return out;
 }
 
@@ -295,11 +289,9 @@ void Lexer::scan(std::string_view text, std::int32_t origin, std::vector<Token>&
             Fail(kSyntax, at, keyword.empty() ? std::string_view("#") : keyword);
         }
         directives_.push_back(std::move(directive));
-        Token t;
-        t.kind = Tok::Directive;
-        t.value = static_cast<std::int32_t>(directives_.size() - 1);
-        t.offset = at;
-        t.text = "#";
+        // The index rides in the length bits: a directive has no text of its own.
+        Token t = Token::Make(Tok::Directive, {}, at);
+        t.bits |= static_cast<std::uint32_t>((directives_.size() - 1) & 0xFFFFFFu);
         out.push_back(t);
     }
 }
@@ -340,8 +332,8 @@ void Lexer::expand(const Token* tokens, std::size_t count, int macroDepth, std::
 {
     for (std::size_t i = 0; i < count; ++i) {
         const Token& t = tokens[i];
-        if (t.kind == Tok::Directive) {
-            const Directive& directive = directives_[static_cast<std::size_t>(t.value)];
+        if (t.kind() == Tok::Directive) {
+            const Directive& directive = directives_[t.index()];
             switch (directive.kind) {
             case Directive::Define:
                 macros_[directive.name] = &directive.macro;
@@ -355,7 +347,7 @@ void Lexer::expand(const Token* tokens, std::size_t count, int macroDepth, std::
             }
             continue;
         }
-        const auto found = t.kind == Tok::Ident ? macros_.find(t.text) : macros_.end();
+        const auto found = t.kind() == Tok::Ident ? macros_.find(t.text()) : macros_.end();
         if (found == macros_.end()) {
             out.push_back(t);
             if (out.size() > limits_.maxTokens) {
@@ -369,7 +361,7 @@ void Lexer::expand(const Token* tokens, std::size_t count, int macroDepth, std::
             continue;
         }
         if (macroDepth >= limits_.maxMacroDepth || ++expansions_ > limits_.maxMacroExpansions) {
-            Fail(kTranslationStack, t.offset, t.text);
+            Fail(kTranslationStack, t.offset, t.text());
         }
         std::vector<Token> expansion;
         if (!macro.functionLike) {
@@ -387,7 +379,7 @@ void Lexer::expand(const Token* tokens, std::size_t count, int macroDepth, std::
             bool closed = false;
             for (; j < count; ++j) {
                 const Token& a = tokens[j];
-                if (a.kind == Tok::Directive) {
+                if (a.kind() == Tok::Directive) {
                     break;
                 }
                 if (a.is("(")) {
@@ -404,24 +396,24 @@ void Lexer::expand(const Token* tokens, std::size_t count, int macroDepth, std::
                 }
             }
             if (!closed) {
-                Fail(kSyntax, t.offset, t.text);
+                Fail(kSyntax, t.offset, t.text());
             }
             if (j > argStart || !args.empty()) {
                 args.emplace_back(argStart, j);
             }
             if (args.size() > macro.params.size()) {
-                Fail(kTooManyMacroParams, t.offset, t.text);
+                Fail(kTooManyMacroParams, t.offset, t.text());
             }
             if (args.size() < macro.params.size()) {
-                Fail(kTooFewMacroParams, t.offset, t.text);
+                Fail(kTooFewMacroParams, t.offset, t.text());
             }
             for (const Token& b : macro.body) {
                 std::size_t k = 0;
-                while (b.kind == Tok::Ident && k < macro.params.size() &&
-                       macro.params[k] != b.text) {
+                while (b.kind() == Tok::Ident && k < macro.params.size() &&
+                       macro.params[k] != b.text()) {
                     ++k;
                 }
-                if (b.kind == Tok::Ident && k < macro.params.size()) {
+                if (b.kind() == Tok::Ident && k < macro.params.size()) {
                     for (std::size_t a = args[k].first; a < args[k].second; ++a) {
                         Token copy = tokens[a];
                         copy.offset = t.offset;
@@ -433,7 +425,7 @@ void Lexer::expand(const Token* tokens, std::size_t count, int macroDepth, std::
                     expansion.push_back(copy);
                 }
                 if (expansion.size() > limits_.maxTokens) {
-                    Fail(kTranslationStack, t.offset, t.text);
+                    Fail(kTranslationStack, t.offset, t.text());
                 }
             }
             i = j; // past the ')'

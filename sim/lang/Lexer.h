@@ -19,14 +19,51 @@ namespace tessel::lang {
 
 enum class Tok : std::uint8_t { Ident, Number, Punct, Directive, End };
 
+// 16 bytes: a long script has a token every two or three characters, and the list is held
+// whole while the program is compiled.
 struct Token {
-    Tok kind = Tok::End;
-    std::string_view text;
-    std::int32_t value = 0; // numbers: the value; directives: index into the directive list
+    const char* start = nullptr;
     std::int32_t offset = 0;
+    std::uint32_t bits = static_cast<std::uint32_t>(Tok::End) << 24; // kind, then length or index
 
-    bool is(std::string_view punct) const { return kind == Tok::Punct && text == punct; }
-    bool isWord(std::string_view word) const { return kind == Tok::Ident && text == word; }
+    static Token Make(Tok kind, std::string_view text, std::int32_t offset)
+    {
+        Token t;
+        t.start = text.data();
+        t.offset = offset;
+        t.bits = (static_cast<std::uint32_t>(kind) << 24) |
+                 static_cast<std::uint32_t>(text.size() & 0xFFFFFFu);
+        return t;
+    }
+
+    Tok kind() const { return static_cast<Tok>(bits >> 24); }
+    // Directives have no text of their own; "#" stands for them in messages.
+    std::string_view text() const
+    {
+        return kind() == Tok::Directive ? std::string_view("#")
+                                        : std::string_view(start, bits & 0xFFFFFFu);
+    }
+    // A directive's index into the directive list.
+    std::size_t index() const { return bits & 0xFFFFFFu; }
+    // A number's value (the scanner has checked that it is one, 0 to 65535).
+    std::int32_t value() const
+    {
+        const std::string_view digits = text();
+        std::int32_t value = 0;
+        if (digits.size() > 2 && (digits[1] == 'x' || digits[1] == 'X')) {
+            for (char c : digits.substr(2)) {
+                value = value * 16 + (c <= '9' ? c - '0' : (c | 0x20) - 'a' + 10);
+            }
+        } else {
+            for (char c : digits) {
+                value = value * 10 + (c - '0');
+            }
+        }
+        return value;
+    }
+
+    bool is(std::string_view punct) const { return kind() == Tok::Punct && text() == punct; }
+    bool isWord(std::string_view word) const { return kind() == Tok::Ident && text() == word; }
 };
 
 class Lexer {

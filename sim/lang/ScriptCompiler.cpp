@@ -128,7 +128,7 @@ private:
     }
     static std::string_view Shown(const Token& t)
     {
-        return t.kind == Tok::End ? std::string_view("end of text") : t.text;
+        return t.kind() == Tok::End ? std::string_view("end of text") : t.text();
     }
     [[noreturn]] void syntax(const Token& t) { Fail(kSyntax, t.offset, Shown(t)); }
     bool accept(std::string_view punct)
@@ -162,7 +162,7 @@ private:
     const Token& expectName()
     {
         const Token& t = peek();
-        if (t.kind != Tok::Ident || IsReserved(t.text)) {
+        if (t.kind() != Tok::Ident || IsReserved(t.text())) {
             Fail(kNameExpected, t.offset, Shown(t));
         }
         return take();
@@ -180,8 +180,8 @@ private:
     }
     void checkFree(const Token& name)
     {
-        if (lookup(name.text) != nullptr) {
-            Fail(kNameDeclared, name.offset, name.text);
+        if (lookup(name.text()) != nullptr) {
+            Fail(kNameDeclared, name.offset, name.text());
         }
     }
     int addName(int kind, std::string_view name)
@@ -210,9 +210,9 @@ private:
     {
         take(); // program
         const Token& name = expectName();
-        out_.listing.programName = std::string(name.text);
+        out_.listing.programName = std::string(name.text());
         out_.program.kind = ObjectKind::Program;
-        addSymbolLine("program", 0, name.text);
+        addSymbolLine("program", 0, name.text());
         const Token& open = peek();
         expect("{");
         std::vector<RoutineDecl> routines;
@@ -224,7 +224,7 @@ private:
             if (t.is("}")) {
                 break;
             }
-            if (t.kind == Tok::End) { // the program's braces do not close
+            if (t.kind() == Tok::End) { // the program's braces do not close
                 Fail(kSyntax, open.offset, "{");
             }
             if (t.is(";")) {
@@ -247,18 +247,18 @@ private:
                 checkFree(routineName);
                 if (isTask) {
                     if (taskCount + 2 > caps_.tasks) { // main always takes one
-                        Fail(kNoMoreTasks, routineName.offset, routineName.text);
+                        Fail(kNoMoreTasks, routineName.offset, routineName.text());
                     }
                     ++taskCount;
                 } else if (subCount + 1 > caps_.subroutines) {
-                    Fail(kNoMoreSubs, routineName.offset, routineName.text);
+                    Fail(kNoMoreSubs, routineName.offset, routineName.text());
                 } else {
                     ++subCount;
                 }
                 const int number = isTask ? taskCount : subCount - 1;
-                globals_[routineName.text] = Symbol{isTask ? Sym::Task : Sym::Sub, number};
-                addSymbolLine(isTask ? "task" : "sub", number, routineName.text);
-                routines.push_back({isTask ? Sym::Task : Sym::Sub, routineName.text, number, pos_,
+                globals_[routineName.text()] = Symbol{isTask ? Sym::Task : Sym::Sub, number};
+                addSymbolLine(isTask ? "task" : "sub", number, routineName.text());
+                routines.push_back({isTask ? Sym::Task : Sym::Sub, routineName.text(), number, pos_,
                                     routineName.offset});
                 skipBlock();
             } else {
@@ -266,7 +266,7 @@ private:
             }
         }
         const Token& close = take();
-        if (peek().kind != Tok::End) {
+        if (peek().kind() != Tok::End) {
             syntax(peek());
         }
         if (!haveMain) {
@@ -295,7 +295,7 @@ private:
         int depth = 0;
         for (;;) {
             const Token& t = take();
-            if (t.kind == Tok::End) {
+            if (t.kind() == Tok::End) {
                 Fail(kSyntax, open.offset, "{");
             }
             if (t.is("{")) {
@@ -310,75 +310,75 @@ private:
     void declaration(bool local)
     {
         const Token& keyword = take();
-        const std::string_view kind = keyword.text;
+        const std::string_view kind = keyword.text();
         do {
             const Token& name = expectName();
             checkFree(name);
             if (kind == "const") {
                 expect("=");
                 const int value = constant();
-                (local ? locals_ : globals_)[name.text] = Symbol{Sym::Const, value};
-                addSymbolLine("const", value, name.text);
+                (local ? locals_ : globals_)[name.text()] = Symbol{Sym::Const, value};
+                addSymbolLine("const", value, name.text());
                 continue;
             }
             if (kind == "var" && local) {
                 if (routineKind_ == Sym::Sub) {
-                    Fail(kLocalOutsideTask, name.offset, name.text);
+                    Fail(kLocalOutsideTask, name.offset, name.text());
                 }
                 const int index = localCount_;
                 if (index >= caps_.locals - liveTemps(true)) {
-                    Fail(kTooManyVariables, name.offset, name.text);
+                    Fail(kTooManyVariables, name.offset, name.text());
                 }
                 ++localCount_;
-                locals_[name.text] = Symbol{Sym::Local, index};
-                SetAt(block_->locals, index, addName(1, name.text));
-                addSymbolLine("local", index, name.text);
+                locals_[name.text()] = Symbol{Sym::Local, index};
+                SetAt(block_->locals, index, addName(1, name.text()));
+                addSymbolLine("local", index, name.text());
                 if (accept("=")) {
                     assign(Operand{Source::Local, static_cast<std::int16_t>(index)}, name.offset);
                 }
                 continue;
             }
             if (local) { // timers, counters, events and semaphores belong to the program
-                Fail(kNotALocal, name.offset, name.text);
+                Fail(kNotALocal, name.offset, name.text());
             }
             if (kind == "var") {
                 const int index = globalCount_;
                 if (index >= caps_.globals) {
-                    Fail(kTooManyVariables, name.offset, name.text);
+                    Fail(kTooManyVariables, name.offset, name.text());
                 }
                 ++globalCount_;
-                globals_[name.text] = Symbol{Sym::Var, index};
-                SetAt(out_.listing.globals, index, addName(0, name.text));
-                addSymbolLine("var", index, name.text);
+                globals_[name.text()] = Symbol{Sym::Var, index};
+                SetAt(out_.listing.globals, index, addName(0, name.text()));
+                addSymbolLine("var", index, name.text());
                 if (accept("=")) {
                     inits_.push_back({index, constant(), name.offset});
                 }
             } else if (kind == "timer") {
                 if (timerCount_ >= caps_.timers) {
-                    Fail(kNoMoreTimers, name.offset, name.text);
+                    Fail(kNoMoreTimers, name.offset, name.text());
                 }
-                globals_[name.text] = Symbol{Sym::Timer, timerCount_};
-                SetAt(out_.listing.timers, timerCount_, addName(2, name.text));
-                addSymbolLine("timer", timerCount_++, name.text);
+                globals_[name.text()] = Symbol{Sym::Timer, timerCount_};
+                SetAt(out_.listing.timers, timerCount_, addName(2, name.text()));
+                addSymbolLine("timer", timerCount_++, name.text());
             } else if (kind == "counter") {
                 if (counterCount_ >= caps_.counters) {
-                    Fail(kTooManyCounters, name.offset, name.text);
+                    Fail(kTooManyCounters, name.offset, name.text());
                 }
-                globals_[name.text] = Symbol{Sym::Counter, counterCount_};
-                SetAt(out_.listing.counters, counterCount_, addName(3, name.text));
-                addSymbolLine("counter", counterCount_++, name.text);
+                globals_[name.text()] = Symbol{Sym::Counter, counterCount_};
+                SetAt(out_.listing.counters, counterCount_, addName(3, name.text()));
+                addSymbolLine("counter", counterCount_++, name.text());
             } else if (kind == "event") {
                 if (eventCount_ >= caps_.events) {
-                    Fail(kTooManyEvents, name.offset, name.text);
+                    Fail(kTooManyEvents, name.offset, name.text());
                 }
-                globals_[name.text] = Symbol{Sym::Event, eventCount_};
-                addSymbolLine("event", eventCount_++, name.text);
+                globals_[name.text()] = Symbol{Sym::Event, eventCount_};
+                addSymbolLine("event", eventCount_++, name.text());
             } else {
                 if (semaphoreCount_ >= caps_.semaphores) {
-                    Fail(kTooManySemaphores, name.offset, name.text);
+                    Fail(kTooManySemaphores, name.offset, name.text());
                 }
-                globals_[name.text] = Symbol{Sym::Semaphore, semaphoreCount_};
-                addSymbolLine("semaphore", semaphoreCount_++, name.text);
+                globals_[name.text()] = Symbol{Sym::Semaphore, semaphoreCount_};
+                addSymbolLine("semaphore", semaphoreCount_++, name.text());
             }
         } while (accept(","));
         accept(";");
@@ -489,7 +489,7 @@ private:
         const Token& open = peek();
         expect("{");
         while (!peek().is("}")) {
-            if (peek().kind == Tok::End) {
+            if (peek().kind() == Tok::End) {
                 Fail(kSyntax, open.offset, "{");
             }
             statement(depth + 1);
@@ -521,10 +521,10 @@ private:
             take();
             return;
         }
-        if (t.kind != Tok::Ident) {
+        if (t.kind() != Tok::Ident) {
             syntax(t);
         }
-        const std::string_view w = t.text;
+        const std::string_view w = t.text();
         if (IsImmediateWord(w)) {
             Fail(kImmediateOnly, t.offset, w);
         }
@@ -615,9 +615,9 @@ private:
         } else if (w == "signal" || w == "await" || w == "acquire" || w == "release") {
             const bool isEvent = w == "signal" || w == "await";
             const Token& name = expectName();
-            const Symbol* symbol = lookup(name.text);
+            const Symbol* symbol = lookup(name.text());
             if (symbol == nullptr || symbol->kind != (isEvent ? Sym::Event : Sym::Semaphore)) {
-                Fail(isEvent ? kEventNotDeclared : kSemaphoreNotDeclared, name.offset, name.text);
+                Fail(isEvent ? kEventNotDeclared : kSemaphoreNotDeclared, name.offset, name.text());
             }
             const Op op = w == "signal"    ? Op::Signal
                           : w == "await"   ? Op::Await
@@ -685,16 +685,16 @@ private:
         if (acceptWord("main")) {
             task = 0;
         } else {
-            if (name.kind != Tok::Ident) {
+            if (name.kind() != Tok::Ident) {
                 syntax(name);
             }
             take();
-            const Symbol* symbol = lookup(name.text);
+            const Symbol* symbol = lookup(name.text());
             if (symbol == nullptr) {
-                Fail(kNameNotDeclared, name.offset, name.text);
+                Fail(kNameNotDeclared, name.offset, name.text());
             }
             if (symbol->kind != Sym::Task) {
-                Fail(kTaskExpected, name.offset, name.text);
+                Fail(kTaskExpected, name.offset, name.text());
             }
             task = symbol->index;
         }
@@ -703,30 +703,30 @@ private:
 
     void callSub(const Token& name)
     {
-        const Symbol* symbol = lookup(name.text);
+        const Symbol* symbol = lookup(name.text());
         if (symbol == nullptr) {
-            Fail(kNameNotDeclared, name.offset, name.text);
+            Fail(kNameNotDeclared, name.offset, name.text());
         }
         if (symbol->kind != Sym::Sub) {
-            Fail(kSyntax, name.offset, name.text);
+            Fail(kSyntax, name.offset, name.text());
         }
         if (routineKind_ == Sym::Sub) {
             if (symbol->index == routineNumber_) {
-                Fail(kSubCallsItself, name.offset, name.text);
+                Fail(kSubCallsItself, name.offset, name.text());
             }
             if (caps_.nesting <= 1) {
-                Fail(kSubCallsSub, name.offset, name.text);
+                Fail(kSubCallsSub, name.offset, name.text());
             }
-            calls_.push_back({routineNumber_, symbol->index, name.offset, name.text});
+            calls_.push_back({routineNumber_, symbol->index, name.offset, name.text()});
         }
         emit(Op::Call, name.offset, {B(symbol->index)});
     }
 
     void assignment(const Token& name)
     {
-        const Symbol* symbol = lookup(name.text);
+        const Symbol* symbol = lookup(name.text());
         if (symbol == nullptr) {
-            Fail(kVariableNotDeclared, name.offset, name.text);
+            Fail(kVariableNotDeclared, name.offset, name.text());
         }
         Operand dest;
         switch (symbol->kind) {
@@ -743,7 +743,7 @@ private:
             dest = {Source::Counter, static_cast<std::int16_t>(symbol->index)};
             break;
         default:
-            Fail(kWritableExpected, name.offset, name.text);
+            Fail(kWritableExpected, name.offset, name.text());
         }
         const Token& op = peek();
         static constexpr struct {
@@ -830,10 +830,10 @@ private:
 
     static int Precedence(const Token& t)
     {
-        if (t.kind != Tok::Punct) {
+        if (t.kind() != Tok::Punct) {
             return 0;
         }
-        const std::string_view p = t.text;
+        const std::string_view p = t.text();
         if (p == "||")
             return 1;
         if (p == "&&")
@@ -876,7 +876,7 @@ private:
 
     int combine(const Token& op, int left, int right)
     {
-        const std::string_view p = op.text;
+        const std::string_view p = op.text();
         const bool constant = at(left).kind == NodeKind::Const && at(right).kind == NodeKind::Const;
         const long a = at(left).value;
         const long b = at(right).value;
@@ -995,35 +995,35 @@ private:
             expect(")");
             return inner;
         }
-        if (t.kind == Tok::Number) {
+        if (t.kind() == Tok::Number) {
             take();
             Node n;
             n.offset = t.offset;
-            n.value = Wrap(t.value);
+            n.value = Wrap(t.value());
             return node(n);
         }
-        if (t.kind != Tok::Ident) {
+        if (t.kind() != Tok::Ident) {
             Fail(kValueExpected, t.offset, Shown(t));
         }
         take();
         Node n;
         n.offset = t.offset;
         n.kind = NodeKind::Value;
-        if (t.text == "input" || t.text == "random") {
+        if (t.text() == "input" || t.text() == "random") {
             expect("(");
-            const bool input = t.text == "input";
+            const bool input = t.text() == "input";
             const int value = input ? constantIn(1, caps_.inputs) : constantIn(1, 32767);
             expect(")");
             n.operand = input ? Operand{Source::Input, static_cast<std::int16_t>(value - 1)}
                               : Operand{Source::Random, static_cast<std::int16_t>(value)};
             return node(n);
         }
-        if (IsReserved(t.text)) {
-            Fail(kValueExpected, t.offset, t.text);
+        if (IsReserved(t.text())) {
+            Fail(kValueExpected, t.offset, t.text());
         }
-        const Symbol* symbol = lookup(t.text);
+        const Symbol* symbol = lookup(t.text());
         if (symbol == nullptr) {
-            Fail(kVariableNotDeclared, t.offset, t.text);
+            Fail(kVariableNotDeclared, t.offset, t.text());
         }
         const auto index = static_cast<std::int16_t>(symbol->index);
         switch (symbol->kind) {
@@ -1044,7 +1044,7 @@ private:
             n.operand = {Source::Counter, index};
             break;
         default:
-            Fail(kValueExpected, t.offset, t.text);
+            Fail(kValueExpected, t.offset, t.text());
         }
         return node(n);
     }
@@ -1248,7 +1248,7 @@ private:
         block_ = &out_.listing.blocks.back();
         block_->name = "immediate";
         routineKind_ = Sym::Task;
-        while (peek().kind != Tok::End) {
+        while (peek().kind() != Tok::End) {
             nodes_.clear();
             immediateCommand();
         }
@@ -1271,10 +1271,10 @@ private:
             take();
             return;
         }
-        if (t.kind != Tok::Ident) {
+        if (t.kind() != Tok::Ident) {
             syntax(t);
         }
-        const std::string_view w = t.text;
+        const std::string_view w = t.text();
         take();
         if (w == "sound") {
             emit(Op::PlaySound, t.offset, {B(constantIn(0, 255))});
@@ -1353,18 +1353,18 @@ private:
         } else {
             // get <address>,<count>: a memory read of 1 to 256 bytes.
             const Token& address = peek();
-            if (address.kind != Tok::Number) {
+            if (address.kind() != Tok::Number) {
                 Fail(kBadGet, address.offset, Shown(address));
             }
             take();
             expect(",");
             const Token& count = peek();
-            if (count.kind != Tok::Number || count.value < 1 || count.value > 256 ||
-                address.value + count.value > 0x10000) {
+            if (count.kind() != Tok::Number || count.value() < 1 || count.value() > 256 ||
+                address.value() + count.value() > 0x10000) {
                 Fail(kBadGet, count.offset, Shown(count));
             }
             take();
-            emit(Op::GetMemory, t.offset, {B(address.value), B(count.value)});
+            emit(Op::GetMemory, t.offset, {B(address.value()), B(count.value())});
         }
     }
 
