@@ -5,16 +5,20 @@
 
 namespace sim {
 
-bool ReadAll(ReaderWriter* file, std::string& text)
+ReadResult Read(ReaderWriter* file, std::string& text)
 {
     text.clear();
     if (file == nullptr || !(file->openRead() == RwOk)) {
-        return false;
+        return ReadResult::NotReadable;
     }
     const std::int32_t size = file->size();
-    if (size < 0 || static_cast<std::size_t>(size) > kMaxFileBytes) {
+    if (size < 0) {
         file->close();
-        return false;
+        return ReadResult::NotReadable;
+    }
+    if (static_cast<std::size_t>(size) > kMaxFileBytes) {
+        file->close();
+        return ReadResult::TooLarge;
     }
     // A text file may read back shorter than its stored size (line ends are folded), so read
     // until the handle gives no more, bounded by the size it reported.
@@ -30,7 +34,7 @@ bool ReadAll(ReaderWriter* file, std::string& text)
     }
     text.resize(filled);
     file->close();
-    return true;
+    return ReadResult::Ok;
 }
 
 bool WriteAll(ReaderWriter* file, const std::string& text)

@@ -14,9 +14,15 @@ namespace sim {
 // Files larger than this are refused rather than read into memory whole.
 constexpr std::size_t kMaxFileBytes = 8u << 20;
 
-// openRead(), the whole content, close(). False when the handle does not open for reading, its
-// size is unknown or beyond kMaxFileBytes.
-bool ReadAll(ReaderWriter* file, std::string& text);
+enum class ReadResult { Ok, NotReadable, TooLarge };
+
+// openRead(), the whole content, close(). NotReadable when the handle does not open for
+// reading or its size is unknown; TooLarge beyond kMaxFileBytes (nothing is read then).
+ReadResult Read(ReaderWriter* file, std::string& text);
+inline bool ReadAll(ReaderWriter* file, std::string& text)
+{
+    return Read(file, text) == ReadResult::Ok;
+}
 
 // openWrite(), the text, close(). False when the handle does not open for writing or takes
 // fewer bytes than given.

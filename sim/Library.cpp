@@ -676,15 +676,4 @@ Long Library::enumerate(Short enumType, Short* item, char* name, Size size, bool
     return entries[next].code;
 }
 
-std::int32_t Library::lastSound(const std::string& brick)
-{
-    std::lock_guard<std::mutex> lock(mutex_);
-    for (const auto& b : bricks_) {
-        if (b->name() == brick) {
-            return b->lastSound();
-        }
-    }
-    return -1;
-}
-
 } // namespace sim

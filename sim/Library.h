@@ -103,9 +103,6 @@ public:
     Long findFirst(Short enumType, Short* item, char* name, Size size);
     Long findNext(Short enumType, Short* item, char* name, Size size);
 
-    // What a test can observe of the model (under the lock).
-    std::int32_t lastSound(const std::string& brick);
-
 private:
     Library() = default;
 

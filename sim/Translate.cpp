@@ -74,8 +74,10 @@ Long Library::validate(Short brickType, ReaderWriter* source, IError* sink, Read
         return kBadSourceType;
     }
     std::string text;
-    if (!ReadAll(source, text)) {
-        return kBadSource;
+    const ReadResult read = Read(source, text);
+    if (read != ReadResult::Ok) {
+        // A source too large to hold is the compiler's "error while reading source file".
+        return read == ReadResult::TooLarge ? Compiler(152) : kBadSource;
     }
     WorkspaceIncludes includes(source);
     SinkDiagnostics diagnostics(sink);
@@ -107,8 +109,10 @@ Long Library::translate(Short brickType, ReaderWriter* source, ReaderWriter* tar
         return kBadTargetType;
     }
     std::string text;
-    if (!ReadAll(source, text)) {
-        return kBadSource;
+    const ReadResult read = Read(source, text);
+    if (read != ReadResult::Ok) {
+        // A source too large to hold is the compiler's "error while reading source file".
+        return read == ReadResult::TooLarge ? Compiler(152) : kBadSource;
     }
     WorkspaceIncludes includes(source);
     SinkDiagnostics diagnostics(sink);

@@ -137,6 +137,8 @@ TEST_F(Translation, HostileSourcesFailWithACompilerCode)
     }
     EXPECT_LT(translate(nested), 0);
     EXPECT_LT(translate("#define A A A\nA"), 0);
+    // Larger than the library reads at all: the same compiler code as an oversized script.
+    EXPECT_EQ(translate(std::string(9u << 20, 'a')), Code(0xE0050898u));
 }
 
 TEST_F(Translation, FirmwareImagesDownloadInBootMode)
