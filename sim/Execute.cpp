@@ -184,7 +184,9 @@ Long Library::exec(Long handle, ReaderWriter* code, Long* result, ReaderWriter* 
         std::int32_t millis = 0;
         {
             std::lock_guard<std::mutex> lock(mutex_);
-            ensureLoaded();
+            if (find(handle) == nullptr) {
+                return kBadHandle;
+            }
             millis = scenario_.linkMillisPerCommand * commands;
         }
         std::this_thread::sleep_for(std::chrono::milliseconds(millis));
