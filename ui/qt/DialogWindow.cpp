@@ -79,9 +79,14 @@ QWidget* DialogWindow::makeControl(const ControlSpec& spec, QWidget* parent)
     case ControlKind::Label:
         widget = new QLabel(caption, parent);
         break;
-    case ControlKind::GroupBox:
-        widget = new QGroupBox(caption, parent);
+    case ControlKind::GroupBox: {
+        auto* frame = new QGroupBox(caption, parent);
+        // The controls are placed over the frame, not laid out in it; a flat frame keeps its
+        // border from running through the first of them.
+        frame->setFlat(true);
+        widget = frame;
         break;
+    }
     case ControlKind::Edit:
         widget = new QLineEdit(parent);
         break;

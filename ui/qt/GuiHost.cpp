@@ -31,7 +31,7 @@ void StartupMessageHandler(QtMsgType type, const QMessageLogContext& context,
         StartupMessages() << message;
         return;
     }
-    const QString first = !StartupMessages().isEmpty() ? StartupMessages().last() : message;
+    const QString first = !StartupMessages().isEmpty() ? StartupMessages().first() : message;
     const std::string detail = first.section(QLatin1Char('\n'), 0, 0).toStdString();
     std::fprintf(stderr,
                  "harbor: the window system cannot be reached (%s); run \"harbor --headless\" "

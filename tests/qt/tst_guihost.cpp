@@ -1,0 +1,62 @@
+// The window program's start: the application and host that CreateGuiHost makes, seen from
+// outside through harbor itself. Without a reachable display harbor says so in one line,
+// names the headless mode, and ends without a crash.
+#include <QProcess>
+#include <QTest>
+
+class tst_GuiHost : public QObject {
+    Q_OBJECT
+
+private slots:
+    void withoutDisplay_data();
+    void withoutDisplay();
+};
+
+void tst_GuiHost::withoutDisplay_data()
+{
+    QTest::addColumn<QString>("platform");
+    QTest::addColumn<QString>("display");
+    QTest::addColumn<QString>("says");
+
+    // Nothing names a display: the program does not even try.
+    QTest::newRow("no display set") << ""
+                                    << ""
+                                    << "no display";
+    // A display is named but cannot be reached: the window system refuses.
+    QTest::newRow("display unreachable") << "xcb"
+                                         << ":4711"
+                                         << "cannot be reached";
+    QTest::newRow("unknown platform") << "no-such-platform"
+                                      << ""
+                                      << "cannot be reached";
+}
+
+void tst_GuiHost::withoutDisplay()
+{
+    QFETCH(QString, platform);
+    QFETCH(QString, display);
+    QFETCH(QString, says);
+
+    QProcessEnvironment environment = QProcessEnvironment::systemEnvironment();
+    for (const char* name : {"DISPLAY", "WAYLAND_DISPLAY", "QT_QPA_PLATFORM"})
+        environment.remove(QString::fromLatin1(name));
+    if (!platform.isEmpty())
+        environment.insert(QStringLiteral("QT_QPA_PLATFORM"), platform);
+    if (!display.isEmpty())
+        environment.insert(QStringLiteral("DISPLAY"), display);
+
+    QProcess harbor;
+    harbor.setProcessEnvironment(environment);
+    harbor.start(QStringLiteral(HARBOR_PROGRAM), {});
+    QVERIFY(harbor.waitForFinished(60000));
+    QCOMPARE(harbor.exitStatus(), QProcess::NormalExit); // no crash, no abort
+    QCOMPARE(harbor.exitCode(), 1);
+    const QByteArray errors = harbor.readAllStandardError();
+    QVERIFY2(errors.count('\n') == 1, errors.constData());
+    QVERIFY2(errors.contains(says.toUtf8()), errors.constData());
+    QVERIFY2(errors.contains("harbor --headless"), errors.constData());
+    QCOMPARE(harbor.readAllStandardOutput(), QByteArray());
+}
+
+QTEST_GUILESS_MAIN(tst_GuiHost)
+#include "tst_guihost.moc"
