@@ -175,8 +175,9 @@ Long Library::exec(Long handle, ReaderWriter* code, Long* result, ReaderWriter* 
     if (parsed < 0) {
         return parsed;
     }
+    // A program runs on the brick once it is downloaded; firmware is only ever downloaded.
     if (program.kind != ObjectKind::Immediate) {
-        return kBadSourceType;
+        return Compiler(132);  // "primitive only available in download mode"
     }
     const auto commands = static_cast<std::int32_t>(program.immediate.size());
     if (callback == nullptr) {
@@ -258,7 +259,7 @@ Long Library::download(Long handle, ReaderWriter* code, Callback callback, void*
         return parsed;
     }
     if (program.kind == ObjectKind::Immediate) {
-        return kBadSourceType;
+        return Compiler(131);  // "primitive only available in immediate mode"
     }
     std::unique_lock<std::mutex> lock(mutex_);
     if (find(handle) == nullptr) {
