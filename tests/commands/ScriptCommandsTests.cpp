@@ -139,6 +139,24 @@ TEST_F(ScriptCommands, AnAsyncFailureReportedLaterIsShownAndOffersHelp)
     EXPECT_EQ(Offers().size(), 1u);
 }
 
+TEST_F(ScriptCommands, AnAsyncCallRefusedOutrightIsShownWithoutAnOffer)
+{
+    // A second execution while the first is still on the slow link: the library refuses it
+    // at once and will never report on it.
+    ASSERT_NO_FATAL_FAILURE(Start("link-time = 1000\n[brick b1]\n[port COM1]\n", "Serial=COM1"));
+    ClearEvents();
+    EditBinary(kSoundRequest);
+    Click(ui::IdExecuteAsync);
+    Click(ui::IdExecuteAsync);
+    const std::string busy =
+        "Error (0xe005040a) from Tessel driver: cannot execute request (driver busy)";
+    EXPECT_EQ(LastStatus(), busy);
+    EXPECT_TRUE(Offers().empty());
+    EXPECT_EQ(dialog().operationsInFlight(), 1);
+    Settle();
+    EXPECT_EQ(LastStatus(), "Exec ok");
+}
+
 TEST_F(ScriptCommands, AnAsyncResultArrivingAfterTheWindowClosedIsReleased)
 {
     ASSERT_NO_FATAL_FAILURE(StartOpen());
