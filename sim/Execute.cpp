@@ -177,7 +177,7 @@ Long Library::exec(Long handle, ReaderWriter* code, Long* result, ReaderWriter* 
     }
     // A program runs on the brick once it is downloaded; firmware is only ever downloaded.
     if (program.kind != ObjectKind::Immediate) {
-        return Compiler(132);  // "primitive only available in download mode"
+        return kBadSourceType;
     }
     const auto commands = static_cast<std::int32_t>(program.immediate.size());
     if (callback == nullptr) {
@@ -259,7 +259,7 @@ Long Library::download(Long handle, ReaderWriter* code, Callback callback, void*
         return parsed;
     }
     if (program.kind == ObjectKind::Immediate) {
-        return Compiler(131);  // "primitive only available in immediate mode"
+        return kBadSourceType;  // immediate commands are executed, not downloaded
     }
     std::unique_lock<std::mutex> lock(mutex_);
     if (find(handle) == nullptr) {

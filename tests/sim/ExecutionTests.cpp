@@ -143,9 +143,9 @@ TEST_F(Exec, NonObjectCodeAndNullsAreRefused)
     EXPECT_EQ(api().download(handle_, nullptr, nullptr, nullptr), Code(0xE0050C64u));
     EXPECT_EQ(run(4242, Immediate(Sound(4)), &number), Code(0xE0050401u));
     // A program object is downloaded, not executed, and immediate commands are not downloaded.
-    EXPECT_EQ(run(handle_, MessageProgram(1), &number), Code(0xE0050884u));
+    EXPECT_EQ(run(handle_, MessageProgram(1), &number), Code(0xE0050C94u));
     Recorder recorder;
-    EXPECT_EQ(downloadAndWait(handle_, Immediate(Sound(4)), recorder, 1), Code(0xE0050883u));
+    EXPECT_EQ(downloadAndWait(handle_, Immediate(Sound(4)), recorder, 1), Code(0xE0050C94u));
 }
 
 TEST_F(Exec, FirmwareDownloadNeedsBootModeAndChangesTheVersion)
