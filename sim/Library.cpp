@@ -462,7 +462,8 @@ Long Library::set(Long handle, Short property, Short value)
         if (value < tessel::RangeShort || value > tessel::RangeLong) {
             return kBadParameters;
         }
-        if (value == tessel::RangeLong && !connection->port->spec.longRange) {
+        if (value == tessel::RangeLong &&
+            (!connection->port->spec.longRange || connection->port->spec.longRangeFails)) {
             return kLongRangeFailed;
         }
         const std::int32_t sent = exchange(*connection, connection->execRetries, false);

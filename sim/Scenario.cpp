@@ -179,6 +179,11 @@ bool ParsePortKey(PortSpec& port, const std::string& key, const std::string& val
         return true;
     }
     if (key == "long-range") {
+        port.longRangeFails = Lower(value) == "fails";
+        if (port.longRangeFails) {
+            port.longRange = true;
+            return true;
+        }
         return ParseBool(value, port.longRange);
     }
     if (key == "unplug-after") {

@@ -30,6 +30,7 @@ struct PortSpec {
     PortState state = PortState::Ok;
     TowerState tower = TowerState::Present;
     bool longRange = false;        // USB towers only
+    bool longRangeFails = false;   // it claims the long range, but setting it fails
     std::int32_t unplugAfter = -1; // USB: unplugged after this many packets; -1 never
     std::int32_t loss = 0;         // percent of packets lost on the infrared link
     bool statistics = true;        // false: the tower refuses to collect statistics

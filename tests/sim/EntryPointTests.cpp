@@ -193,11 +193,17 @@ TEST_F(Properties, RangeBelongsToUsbTowersOnly)
 
 TEST_F(Properties, LongRangeFailsWhereTheTowerHasNone)
 {
-    useShipped("short-range.sim");
-    const Long handle = open("KIVOTOWER1");
+    useScenario("[brick b]\n[port KIVOTOWER1]\nlong-range = no\n");
+    Long handle = open("KIVOTOWER1");
     Short value = 0;
     ASSERT_EQ(api().get(handle, tessel::PropLongRange, &value, nullptr, 0), 0);
     EXPECT_NE(value, tessel::kLongRangeAvailable);
+    EXPECT_EQ(api().set(handle, tessel::PropRange, tessel::RangeLong), Code(0xE0050413u));
+    // A tower that claims the long range and fails to switch.
+    useShipped("short-range.sim");
+    handle = open("KIVOTOWER1");
+    ASSERT_EQ(api().get(handle, tessel::PropLongRange, &value, nullptr, 0), 0);
+    EXPECT_EQ(value, tessel::kLongRangeAvailable);
     EXPECT_EQ(api().set(handle, tessel::PropRange, tessel::RangeLong), Code(0xE0050413u));
     EXPECT_EQ(api().set(handle, tessel::PropRange, tessel::RangeShort), 0);
 }
