@@ -1,0 +1,117 @@
+// Start-up of harbor to its shown window, and its peak resident memory, against a bare Qt
+// program that shows one empty dialog, both started the same way: offscreen, from a fork,
+// timed from the fork to the "shown" line each prints once its window is up.
+#include <benchmark/benchmark.h>
+
+#include <fcntl.h>
+#include <signal.h>
+#include <sys/resource.h>
+#include <sys/wait.h>
+#include <unistd.h>
+
+#include <chrono>
+#include <cstdio>
+#include <cstdlib>
+#include <cstring>
+#include <string>
+#include <vector>
+
+namespace {
+
+// A child that never says "shown" within this is killed; the run is then an error.
+constexpr int kGiveUpSeconds = 30;
+
+struct Launch {
+    bool shown = false;
+    double secondsToShown = 0;
+    long peakKiB = 0;
+};
+
+Launch Run(const std::vector<std::string>& command)
+{
+    Launch launch;
+    int out[2];
+    if (pipe(out) != 0)
+        return launch;
+    const auto start = std::chrono::steady_clock::now();
+    const pid_t child = fork();
+    if (child == 0) {
+        dup2(out[1], STDOUT_FILENO);
+        close(out[0]);
+        close(out[1]);
+        const int null = open("/dev/null", O_WRONLY);
+        if (null >= 0)
+            dup2(null, STDERR_FILENO);
+        std::vector<char*> argv;
+        for (const std::string& word : command)
+            argv.push_back(const_cast<char*>(word.c_str()));
+        argv.push_back(nullptr);
+        execv(argv[0], argv.data());
+        _exit(127);
+    }
+    close(out[1]);
+    alarm(kGiveUpSeconds);
+    std::string said;
+    char buffer[256];
+    for (;;) {
+        const ssize_t got = read(out[0], buffer, sizeof buffer);
+        if (got <= 0)
+            break;
+        said.append(buffer, static_cast<std::size_t>(got));
+        if (!launch.shown && said.find("shown\n") != std::string::npos) {
+            launch.shown = true;
+            launch.secondsToShown =
+                std::chrono::duration<double>(std::chrono::steady_clock::now() - start).count();
+        }
+    }
+    close(out[0]);
+    int status = 0;
+    rusage usage{};
+    wait4(child, &status, 0, &usage);
+    alarm(0);
+    launch.peakKiB = usage.ru_maxrss;
+    return launch;
+}
+
+void Measure(benchmark::State& state, const std::vector<std::string>& command)
+{
+    long peakKiB = 0;
+    for (auto _ : state) {
+        const Launch launch = Run(command);
+        if (!launch.shown) {
+            state.SkipWithError("the program never said it was shown");
+            return;
+        }
+        state.SetIterationTime(launch.secondsToShown);
+        peakKiB = std::max(peakKiB, launch.peakKiB);
+    }
+    state.counters["peak_rss_KiB"] = static_cast<double>(peakKiB);
+}
+
+void BM_StartupHarbor(benchmark::State& state)
+{
+    // The settings beside harbor in the build load the simulated library.
+    Measure(state, {HARBOR_BIN_DIR "/harbor"});
+}
+
+void BM_StartupEmptyDialog(benchmark::State& state)
+{
+    Measure(state, {HARBOR_BIN_DIR "/bench_empty_dialog"});
+}
+
+} // namespace
+
+BENCHMARK(BM_StartupEmptyDialog)->UseManualTime()->Unit(benchmark::kMillisecond)->Iterations(5);
+BENCHMARK(BM_StartupHarbor)->UseManualTime()->Unit(benchmark::kMillisecond)->Iterations(5);
+
+int main(int argc, char** argv)
+{
+    // Killed children must not take the driver with them; the alarm only ends a hung read.
+    signal(SIGALRM, [](int) {});
+    setenv("QT_QPA_PLATFORM", "offscreen", 1);
+    setenv("HARBOR_EXIT_WHEN_SHOWN", "1", 1);
+    benchmark::Initialize(&argc, argv);
+    benchmark::RunSpecifiedBenchmarks();
+    benchmark::Shutdown();
+    return 0;
+}
