@@ -36,6 +36,9 @@ struct Row {
     bool offered;          // the Trouble Shooter is offered by the judged command
     std::string ports = "";
     const char* hostileMode = nullptr; // run against the hostile library in this mode
+    // Judged from this command to the end instead of the last command alone (for a report
+    // that may arrive while the command runs or while a later one waits for it).
+    const char* judgeFrom = nullptr;
 };
 
 std::string Last(const std::string& script)
@@ -117,12 +120,15 @@ std::vector<Row> Rows()
         {"script", "execution call failed", lowBattery, immediate + "Execute\n", kBattery, true},
         {"script", "download call failed", "", program + "Download\n", kHostileFailure, true, "",
          "download-refused"},
-        {"script", "Async call itself failed", kWorking, noCommands + "Execute Async\n",
-         "Error (0xe0050c94) from Tessel tsl: bad source type", false},
+        {"script", "Async call itself failed", "", immediate + "Execute Async\n", kHostileFailure,
+         false, "", "exec-refused"},
         {"script", "failure reported by the execution callback", lowBattery,
          immediate + "Execute Async\n", kBattery, true},
         {"script", "failure reported by the download callback", Scenario("", "unplug-after = 4\n"),
          longObject + "Download\n", kUnplugged, true},
+        {"script", "failure reported by the reception callback", "",
+         "Receive on\nWait Status Received bad PBMessage, error: 0xe0050c41\n",
+         "Received bad PBMessage, error: 0xe0050c41", false, "", "reception-fails", "Receive on"},
         // ---- firmware download ----
         {"firmware", "no open port", kWorking, "Close\nDownload Firmware\n", "Port not open",
          false},
@@ -132,6 +138,8 @@ std::vector<Row> Rows()
          "Error (0xe0050c93) from Tessel tsl: bad source (OpenRead failed)", true},
         {"firmware", "brick silent before the download", "", "Download Firmware\n", "No brick",
          false, "", "silent-after-boot"},
+        {"firmware", "brick silent after the download", "", "Download Firmware\n", "No brick",
+         false, "", "silent-after-download"},
         {"firmware", "object without commands", "", "Download Firmware\n", "No code", false, "",
          "empty-object"},
         {"firmware", "download not started", "", "Download Firmware\n", kHostileFailure, true, "",
@@ -183,7 +191,8 @@ TEST_P(FaultMatrix, ShowsTheRowsTextAndOfferAndLeaksNothing)
     const Transcript transcript = RunHeadless(dir, setup, row.script);
     ::unsetenv("HARBOR_HOSTILE");
 
-    const std::vector<std::string> judged = transcript.of(Last(row.script));
+    const std::vector<std::string> judged =
+        row.judgeFrom != nullptr ? transcript.from(row.judgeFrom) : transcript.of(Last(row.script));
     ASSERT_FALSE(judged.empty()) << transcript.text();
     const std::vector<std::string> statuses = Transcript::Statuses(judged);
     ASSERT_FALSE(statuses.empty()) << transcript.text();

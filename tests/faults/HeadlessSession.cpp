@@ -135,6 +135,17 @@ std::vector<std::string> Transcript::of(const std::string& command) const
     return found;
 }
 
+std::vector<std::string> Transcript::from(const std::string& command) const
+{
+    const std::string marker = "> " + command;
+    for (std::size_t i = lines.size(); i-- > 0;) {
+        if (lines[i] == marker) {
+            return std::vector<std::string>(lines.begin() + static_cast<long>(i), lines.end());
+        }
+    }
+    return {};
+}
+
 std::vector<std::string> Transcript::Statuses(const std::vector<std::string>& lines)
 {
     std::vector<std::string> texts;

@@ -35,6 +35,8 @@ struct Transcript {
     // The lines printed for the last run of command (from its "> command" line up to the next
     // command's); empty when it did not run.
     std::vector<std::string> of(const std::string& command) const;
+    // The lines from the last run of command to the end.
+    std::vector<std::string> from(const std::string& command) const;
     // The status texts among lines, unescaped only as far as the transcript leaves them.
     static std::vector<std::string> Statuses(const std::vector<std::string>& lines);
     // Whether one of lines asks "Use Trouble Shooter?".

@@ -19,6 +19,9 @@
 // that answers, objects of three commands, downloads that report their end) except for:
 //   create-fails       tslCreate answers 0
 //   silent-after-boot  "boot rom" runs, "brick alive?" fails
+//   silent-after-download  "brick alive?" fails once a download has run
+//   reception-fails    reception reports one failure instead of a message
+//   exec-refused       tslExec of code fails at once (waiting or in the background)
 //   type-unreadable    reading property 1 (brick type) fails
 //   empty-object       translation succeeds and writes nothing
 //   download-refused   tslDownload fails at once
@@ -124,6 +127,7 @@ Threads& Workers()
 }
 
 std::atomic<bool> g_receiving{false};
+std::atomic<bool> g_downloaded{false};
 std::mutex g_sourceMutex;
 std::string g_lastSource;
 
@@ -158,6 +162,7 @@ void WriteAll(ReaderWriter* file, const std::string& text)
 
 Long tslInitialise()
 {
+    g_downloaded = false;
     return 0;
 }
 
@@ -284,7 +289,10 @@ Long tslExec(Long, ReaderWriter* code, Long* result, ReaderWriter* resultFile, C
     if (code == nullptr) {
         // Reception on or off. Messages come from several threads, with odd numbers.
         g_receiving = callback != nullptr;
-        if (callback != nullptr) {
+        if (callback != nullptr && Is("reception-fails")) {
+            Workers().startTogether(
+                1, [callback, context](int) { callback(kFailure, context, 0, nullptr); });
+        } else if (callback != nullptr) {
             Workers().startTogether(kThreads, [callback, context](int index) {
                 for (int i = 0; i < kReportsPerThread && g_receiving; ++i) {
                     callback(i % 3 == 0 ? kFailure : 0, context, index % 2 ? INT_MIN : INT_MAX,
@@ -294,11 +302,14 @@ Long tslExec(Long, ReaderWriter* code, Long* result, ReaderWriter* resultFile, C
         }
         return 0;
     }
-    if (Is("silent-after-boot")) {
+    if (Is("silent-after-boot") || (Is("silent-after-download") && g_downloaded)) {
         std::lock_guard<std::mutex> lock(g_sourceMutex);
         if (g_lastSource.find("alive") != std::string::npos) {
             return kFailure;
         }
+    }
+    if (Is("exec-refused")) {
+        return kFailure;
     }
     if (!Hostile()) {
         if (result != nullptr) {
@@ -336,6 +347,7 @@ Long tslDownload(Long, ReaderWriter* code, Callback callback, void* context)
         if (Is("download-refused")) {
             return kFailure;
         }
+        g_downloaded = true;
         // Progress up to the end, from one thread, as a library should.
         Workers().startTogether(1, [callback, context](int) {
             for (int count = 1; count <= kSaneCommands; ++count) {
