@@ -259,7 +259,7 @@ Long Library::download(Long handle, ReaderWriter* code, Callback callback, void*
         return parsed;
     }
     if (program.kind == ObjectKind::Immediate) {
-        return kBadSourceType;  // immediate commands are executed, not downloaded
+        return kBadSourceType; // immediate commands are executed, not downloaded
     }
     std::unique_lock<std::mutex> lock(mutex_);
     if (find(handle) == nullptr) {
