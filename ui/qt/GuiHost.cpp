@@ -61,6 +61,10 @@ std::unique_ptr<ui::WindowHost> CreateGuiHost(int& argc, char** argv)
     // The build and the installation put the help file into help/ beside the program.
     auto host = std::make_unique<ui::QtHost>(platform::ExecutableDirectory() + "help/");
     host->AdoptApplication(std::move(application));
+    // For start-up benchmarks: the program ends as soon as its window is up.
+    const char* exitWhenShown = std::getenv("HARBOR_EXIT_WHEN_SHOWN");
+    if (exitWhenShown != nullptr && exitWhenShown[0] != '\0')
+        host->ExitWhenShown();
     return host;
 }
 

@@ -15,8 +15,10 @@
 #include <QTextBlock>
 #include <QTextCursor>
 #include <QTextDocument>
+#include <QTimer>
 
 #include <chrono>
+#include <cstdio>
 #include <cstring>
 
 #include "troubleshooter/HelpLink.h"
@@ -238,6 +240,15 @@ void QtHost::ShowWindow(WindowHandle window)
         dialog->move(available.center() - QPoint(dialog->width() / 2, dialog->height() / 2));
     }
     dialog->show();
+    if (exitWhenShown_) {
+        exitWhenShown_ = false;
+        // Queued behind the show's expose and first paint.
+        QTimer::singleShot(0, receiver_.get(), [this, window] {
+            std::fputs("shown\n", stdout);
+            std::fflush(stdout);
+            onDialogCommand(window, kIdCancel);
+        });
+    }
 }
 
 void QtHost::DestroyWindow(WindowHandle window)

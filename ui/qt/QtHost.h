@@ -51,6 +51,9 @@ public:
     void SetAnswerer(Answerer* answerer);
     // The help viewer the host hands to the dialog it shows.
     QtHelpViewer& helpViewer() { return *helpViewer_; }
+    // Once the next dialog has been shown, say "shown" on the standard output and close it
+    // as its close box would: for timing the program's start-up from outside.
+    void ExitWhenShown() { exitWhenShown_ = true; }
 
     // --- for the program and the tests -------------------------------------------------
     // The window of a dialog, or null.
@@ -164,6 +167,7 @@ private:
     } pendingExit_;
     // Windows whose widgets wait for deletion until control is back in the event loop.
     std::vector<QPointer<QObject>> doomed_;
+    bool exitWhenShown_ = false;
 };
 
 } // namespace ui
