@@ -16,7 +16,7 @@ namespace {
 namespace fs = std::filesystem;
 using workspace_test::WorkspaceTest;
 
-class DiskFileTest : public WorkspaceTest {
+class DiskFile : public WorkspaceTest {
 protected:
     void SetUp() override
     {
@@ -35,31 +35,21 @@ protected:
     }
 
     std::string hostPath(const char* name) const { return (folder_ / name).string(); }
-
     void writeHost(const char* name, const std::string& bytes) const
     {
-        std::ofstream out(folder_ / name, std::ios::binary | std::ios::trunc);
-        out << bytes;
+        std::ofstream(folder_ / name, std::ios::binary | std::ios::trunc) << bytes;
     }
-
     std::string readHost(const char* name) const
     {
         std::ifstream in(folder_ / name, std::ios::binary);
         return std::string(std::istreambuf_iterator<char>(in), std::istreambuf_iterator<char>());
     }
-
-    // A held entry on a host file, and a handle on it; both are given back by release().
-    ReaderWriter* openHandle(const char* name, DirEnt** entryOut = nullptr)
+    // A handle on a new entry for the host file; the handle's reference is the entry's only one.
+    ReaderWriter* openHandle(const std::string& path) const
     {
-        auto* entry = new DiskEntry(hostPath(name).c_str());
-        entry->addRef();
-        ReaderWriter* handle = entry->open(4);
-        entry->release(); // the handle's own reference keeps it
-        if (entryOut != nullptr) {
-            *entryOut = entry;
-        }
-        return handle;
+        return (new DiskEntry(path.c_str()))->open(4);
     }
+    ReaderWriter* openHandle(const char* name) const { return openHandle(hostPath(name)); }
 
     static std::string take(ReaderWriter* handle, std::int32_t count)
     {
@@ -72,42 +62,54 @@ protected:
     fs::path folder_;
 };
 
-using DiskHandle = DiskFileTest;
-using DiskHandleClosed = DiskFileTest;
-using DiskEntryCopy = DiskFileTest;
-
-TEST_F(DiskHandleClosed, MissingFileGivesNotOpenAndEveryOperationSaysSo)
-{
-    ReaderWriter* handle = openHandle("absent.txt");
-    ASSERT_NE(handle, nullptr);
-    EXPECT_EQ(handle->openRead(), RwNotOpen);
-    char buffer[4] = {};
-    EXPECT_EQ(handle->read(buffer, 4), 0);
-    EXPECT_EQ(handle->write("abcd", 4), -1);
-    EXPECT_EQ(handle->write("abcd", 0), -1);
-    EXPECT_EQ(handle->tell(), -1);
-    EXPECT_EQ(handle->size(), -1);
-    EXPECT_EQ(handle->close(), RwNotOpen);
-    EXPECT_EQ(handle->seek(0), RwNotOpen);
-    EXPECT_EQ(handle->seekBy(1), RwNotOpen);
-    EXPECT_EQ(handle->rewind(), RwNotOpen);
-    EXPECT_FALSE(fs::exists(hostPath("absent.txt"))) << "reading must not create the file";
-    handle->release();
-}
-
-TEST_F(DiskHandleClosed, DirectoryIsNotAFile)
+TEST_F(DiskFile, HandleThatCannotOpenSaysSoInEveryOperation)
 {
     fs::create_directory(folder_ / "sub");
-    ReaderWriter* handle = openHandle("sub");
-    for (const char* mode : {"r", "w", "a", "r+"}) {
-        EXPECT_EQ(handle->open(mode), RwNotOpen) << mode;
-        EXPECT_EQ(handle->read(nullptr, 0), 0);
+    writeHost("plain.txt", "abc");
+    struct Case {
+        std::string path;
+        const char* mode;
+    };
+    const Case cases[] = {
+        {hostPath("absent.txt"), "r"},
+        {hostPath("sub"), "r"}, // a directory is not a file, in any mode
+        {hostPath("sub"), "w"},
+        {hostPath("sub"), "r+"},
+        {hostPath("missing-folder/file.txt"), "w"},
+        {"", "r"},
+        {hostPath("plain.txt"), nullptr},
+        {hostPath("plain.txt"), ""},
+        {hostPath("plain.txt"), "rbbbbbbbbbbbbbb"}, // 15 letters do not fit the buffer
+        {hostPath("plain.txt"), "r,ccs=UTF-8"},     // would make a wide stream
+    };
+    for (const Case& c : cases) {
+        SCOPED_TRACE(c.path + " mode " + (c.mode != nullptr ? c.mode : "<null>"));
+        ReaderWriter* handle = openHandle(c.path);
+        ASSERT_NE(handle, nullptr);
+        EXPECT_FALSE(static_cast<DiskReaderWriter*>(handle)->isOpen());
+        EXPECT_EQ(handle->open(c.mode), RwNotOpen);
+        char buffer[4] = {};
+        EXPECT_EQ(handle->read(buffer, 4), 0);
+        EXPECT_EQ(handle->write("abcd", 4), -1);
+        EXPECT_EQ(handle->write("abcd", 0), -1);
+        EXPECT_EQ(handle->tell(), -1);
+        EXPECT_EQ(handle->size(), -1);
+        EXPECT_EQ(handle->close(), RwNotOpen);
+        EXPECT_EQ(handle->seek(0), RwNotOpen);
+        EXPECT_EQ(handle->seekBy(1), RwNotOpen);
+        EXPECT_EQ(handle->rewind(), RwNotOpen);
+        handle->release();
     }
+    EXPECT_FALSE(fs::exists(hostPath("absent.txt"))) << "reading must not create the file";
     EXPECT_TRUE(fs::is_directory(folder_ / "sub"));
+    EXPECT_EQ(readHost("plain.txt"), "abc");
+    ReaderWriter* handle = openHandle("plain.txt");
+    EXPECT_EQ(handle->open("rbbbbbbbbbbbbb"), RwOk) << "14 letters fit";
+    EXPECT_EQ(take(handle, 10), "abc");
     handle->release();
 }
 
-TEST_F(DiskHandleClosed, UnreadableFileGivesNotOpen)
+TEST_F(DiskFile, UnreadableFileGivesNotOpen)
 {
     writeHost("secret.txt", "hidden");
     fs::permissions(folder_ / "secret.txt", fs::perms::none);
@@ -117,120 +119,55 @@ TEST_F(DiskHandleClosed, UnreadableFileGivesNotOpen)
     }
     ReaderWriter* handle = openHandle("secret.txt");
     EXPECT_EQ(handle->openRead(), RwNotOpen);
-    EXPECT_EQ(handle->size(), -1);
     handle->release();
 }
 
-TEST_F(DiskHandleClosed, BadModesAndPathsGiveNotOpen)
+TEST_F(DiskFile, BytesPassUnchangedAndWriteEmptiesWhileAppendKeeps)
 {
-    writeHost("plain.txt", "abc");
-    ReaderWriter* handle = openHandle("plain.txt");
-    EXPECT_EQ(handle->open(nullptr), RwNotOpen);
-    EXPECT_EQ(handle->open(""), RwNotOpen);
-    EXPECT_EQ(handle->open("rbbbbbbbbbbbbbb"), RwNotOpen) << "15 letters do not fit the buffer";
-    EXPECT_EQ(handle->open("r,ccs=UTF-8"), RwNotOpen);
-    EXPECT_EQ(handle->open("rbbbbbbbbbbbbb"), RwOk) << "14 letters do";
-    EXPECT_EQ(take(handle, 10), "abc");
-    handle->release();
-
-    auto* nameless = new DiskEntry(nullptr);
-    EXPECT_STREQ(nameless->fileName(), "");
-    ReaderWriter* none = nameless->open(0);
-    EXPECT_EQ(none->openRead(), RwNotOpen);
-    none->release();
-
-    auto* deep = new DiskEntry(hostPath("missing-folder/file.txt").c_str());
-    ReaderWriter* nowhere = deep->open(0);
-    EXPECT_EQ(nowhere->openWrite(), RwNotOpen);
-    nowhere->release();
-}
-
-TEST_F(DiskHandle, WriteEmptiesAndAppendKeeps)
-{
-    writeHost("data.txt", "old content");
-    ReaderWriter* handle = openHandle("data.txt");
-    EXPECT_EQ(handle->openWrite(), RwOk);
-    EXPECT_EQ(handle->close(), RwOk);
-    EXPECT_EQ(readHost("data.txt"), "");
-
-    writeHost("data.txt", "head");
-    EXPECT_EQ(handle->open("a"), RwOk);
-    EXPECT_EQ(handle->write("tail", 4), 4);
-    EXPECT_EQ(handle->close(), RwOk);
-    EXPECT_EQ(readHost("data.txt"), "headtail");
-    handle->release();
-}
-
-TEST_F(DiskHandle, BytesPassUnchangedBothWays)
-{
-    ReaderWriter* handle = openHandle("bytes.bin");
+    writeHost("data.bin", "old content");
+    ReaderWriter* handle = openHandle("data.bin");
     ASSERT_EQ(handle->openWrite(), RwOk);
-    EXPECT_EQ(handle->write("a\nb", 3), 3);
-    const std::string binary("\r\n\x1A\0\xFF", 5);
-    EXPECT_EQ(handle->write(binary.data(), 5), 5);
+    const std::string binary("a\nb\r\n\x1A\0\xFF", 8);
+    EXPECT_EQ(handle->write(binary.data(), 8), 8);
     EXPECT_EQ(handle->write("x", 0), 0);
     EXPECT_EQ(handle->write("x", -1), 0);
-    handle->close();
-    EXPECT_EQ(readHost("bytes.bin"), "a\nb" + binary);
-
+    EXPECT_EQ(handle->close(), RwOk);
+    EXPECT_EQ(handle->close(), RwNotOpen) << "the second close is reported";
+    EXPECT_EQ(readHost("data.bin"), binary);
     ASSERT_EQ(handle->openRead(), RwOk);
-    EXPECT_EQ(take(handle, 100), "a\nb" + binary);
-    EXPECT_EQ(take(handle, 100), "") << "reads past the end give 0";
+    EXPECT_EQ(take(handle, 100), binary);
+    EXPECT_EQ(take(handle, 100), "") << "past the end";
+
+    writeHost("data.bin", "head");
+    EXPECT_EQ(handle->open("a"), RwOk);
+    EXPECT_EQ(handle->write("tail", 4), 4);
+    handle->close();
+    EXPECT_EQ(readHost("data.bin"), "headtail");
     handle->release();
 }
 
-TEST_F(DiskHandle, SizeLeavesThePositionWhereItWas)
+TEST_F(DiskFile, SizeAndSeeksKeepTheHostFileAndPosition)
 {
     writeHost("hundred.bin", std::string(100, 'h'));
     ReaderWriter* handle = openHandle("hundred.bin");
-    ASSERT_EQ(handle->openRead(), RwOk);
+    ASSERT_EQ(handle->open("r+"), RwOk);
     EXPECT_EQ(handle->seek(10), RwOk);
     EXPECT_EQ(handle->size(), 100);
-    EXPECT_EQ(handle->tell(), 10);
+    EXPECT_EQ(handle->tell(), 10) << "size leaves the position where it was";
     EXPECT_EQ(handle->seekBy(5), RwOk);
     EXPECT_EQ(handle->tell(), 15);
-    EXPECT_EQ(handle->rewind(), RwOk);
-    EXPECT_EQ(handle->tell(), 0);
     EXPECT_EQ(handle->seek(-1), RwSeekFailed);
-    EXPECT_EQ(handle->seekBy(-1), RwSeekFailed);
-    handle->release();
-}
-
-TEST_F(DiskHandle, SetSizeLeavesTheHostFileAlone)
-{
-    writeHost("fixed.txt", "twelve bytes");
-    ReaderWriter* handle = openHandle("fixed.txt");
-    ASSERT_EQ(handle->open("r+"), RwOk);
+    EXPECT_EQ(handle->seekBy(-100), RwSeekFailed);
     EXPECT_EQ(handle->setSize(0), RwOk);
     EXPECT_EQ(handle->setSize(-1), RwOutOfRange);
-    EXPECT_EQ(handle->size(), 12);
-    handle->close();
-    EXPECT_EQ(readHost("fixed.txt"), "twelve bytes");
+    EXPECT_EQ(handle->size(), 100) << "the host file keeps its length";
+    EXPECT_EQ(handle->rewind(), RwOk);
+    EXPECT_EQ(handle->tell(), 0);
     handle->release();
 }
 
-TEST_F(DiskHandle, CloseTwiceReportsTheSecond)
-{
-    writeHost("twice.txt", "x");
-    ReaderWriter* handle = openHandle("twice.txt");
-    ASSERT_EQ(handle->openRead(), RwOk);
-    EXPECT_EQ(handle->close(), RwOk);
-    EXPECT_EQ(handle->close(), RwNotOpen);
-    handle->release();
-}
-
-TEST_F(DiskHandle, ReopeningClosesTheEarlierStreamFirst)
-{
-    ReaderWriter* handle = openHandle("reopen.txt");
-    ASSERT_EQ(handle->openWrite(), RwOk);
-    EXPECT_EQ(handle->write("abc", 3), 3);
-    // The bytes sit in the first stream's buffer; only closing that stream writes them out.
-    ASSERT_EQ(handle->openRead(), RwOk);
-    EXPECT_EQ(take(handle, 10), "abc");
-    handle->release();
-}
-
-TEST_F(DiskHandle, ReadAndWriteMayAlternateOnAnUpdateStream)
+// A stream open for update must be repositioned between a read and a write; the handle does it.
+TEST_F(DiskFile, ReadAndWriteMayAlternateOnAnUpdateStream)
 {
     writeHost("update.txt", "abcdef");
     ReaderWriter* handle = openHandle("update.txt");
@@ -243,27 +180,32 @@ TEST_F(DiskHandle, ReadAndWriteMayAlternateOnAnUpdateStream)
     handle->release();
 }
 
-TEST_F(DiskHandle, DestroyingAnOpenHandleFlushesAndCloses)
+TEST_F(DiskFile, ReopeningOrReleasingClosesTheEarlierStreamFirst)
 {
-    ReaderWriter* handle = openHandle("flushed.txt");
+    ReaderWriter* handle = openHandle("reopen.txt");
     ASSERT_EQ(handle->openWrite(), RwOk);
-    handle->write("end", 3);
-    EXPECT_EQ(handle->release(), nullptr);
+    EXPECT_EQ(handle->write("abc", 3), 3);
+    // The bytes sit in the first stream's buffer; only closing that stream writes them out.
+    ASSERT_EQ(handle->openRead(), RwOk);
+    EXPECT_EQ(take(handle, 10), "abc");
+    handle->release();
+
+    ReaderWriter* unclosed = openHandle("flushed.txt");
+    ASSERT_EQ(unclosed->openWrite(), RwOk);
+    unclosed->write("end", 3);
+    EXPECT_EQ(unclosed->release(), nullptr);
     EXPECT_EQ(readHost("flushed.txt"), "end");
 }
 
-TEST_F(DiskEntryCopy, CloneNamesTheSameHostFile)
+TEST_F(DiskFile, CloneNamesTheSameHostFileWithItsOwnCopy)
 {
-    writeHost("same.txt", "");
-    DirEnt* entry = nullptr;
-    ReaderWriter* first = openHandle("same.txt", &entry);
-    EXPECT_EQ(std::string(entry->fileName()), hostPath("same.txt"));
+    ReaderWriter* first = openHandle("same.txt");
+    DirEnt* entry = first->dirEnt();
     EXPECT_EQ(std::string(first->fileName()), hostPath("same.txt"));
     DirEnt* clone = entry->clone();
-    ASSERT_NE(clone, nullptr);
     ASSERT_NE(dynamic_cast<DiskEntry*>(clone), nullptr);
     EXPECT_EQ(clone->refCount(), 0);
-    EXPECT_NE(clone->fileName(), entry->fileName()) << "the clone keeps its own copy";
+    EXPECT_NE(clone->fileName(), entry->fileName());
     EXPECT_STREQ(clone->fileName(), entry->fileName());
     ReaderWriter* second = clone->open(0);
     ASSERT_EQ(first->openWrite(), RwOk);
@@ -273,21 +215,6 @@ TEST_F(DiskEntryCopy, CloneNamesTheSameHostFile)
     EXPECT_EQ(take(second, 20), "via first");
     second->release();
     first->release();
-}
-
-TEST_F(DiskEntryCopy, EntryIsAFileWithoutHandleState)
-{
-    auto* entry = new DiskEntry("/nonexistent/place");
-    entry->addRef();
-    EXPECT_FALSE(entry->isDirectory());
-    EXPECT_EQ(entry->name(), nullptr);
-    ReaderWriter* handle = entry->open(2);
-    ASSERT_NE(dynamic_cast<DiskReaderWriter*>(handle), nullptr);
-    EXPECT_FALSE(static_cast<DiskReaderWriter*>(handle)->isOpen());
-    EXPECT_EQ(handle->type(), 2);
-    EXPECT_EQ(entry->refCount(), 2);
-    handle->release();
-    EXPECT_EQ(entry->release(), nullptr);
 }
 
 } // namespace

@@ -12,17 +12,15 @@
 
 namespace workspace_test {
 
-// One line per link, indented by depth: "name (count N)" with "/" after directories, so a
-// failed tree assertion shows the whole tree.
+// One line per link, indented by depth, so that a failed tree assertion shows the whole tree.
 inline void DescribeInto(Directory* directory, int depth, std::string& out)
 {
     std::int32_t index = 0;
     const char* name = nullptr;
     while (DirEnt* entry = directory->next(&index, &name)) {
-        out.append(static_cast<std::size_t>(depth) * 2, ' ');
-        out += name;
-        out += entry->isDirectory() ? "/" : "";
-        out += " (count " + std::to_string(entry->refCount()) + ")\n";
+        out += std::string(static_cast<std::size_t>(depth) * 2, ' ') + name +
+               (entry->isDirectory() ? "/" : "") + " (count " + std::to_string(entry->refCount()) +
+               ")\n";
         if (entry->isDirectory() && entry->parent() == directory) {
             DescribeInto(static_cast<Directory*>(entry), depth + 1, out);
         }
@@ -36,14 +34,11 @@ inline std::string DescribeTree(Directory* top)
     return out;
 }
 
-// The path of an entry as a std::string (the malloc'd buffer freed here); "<null>" for none.
-inline std::string PathOf(DirEnt* entry)
+// The path of an entry or handle as a std::string (the malloc'd buffer freed here).
+template <typename Holder> std::string PathOf(Holder* holder)
 {
-    char* path = entry->path();
-    if (path == nullptr) {
-        return "<null>";
-    }
-    std::string result(path);
+    char* path = holder->path();
+    std::string result = path != nullptr ? path : "<null>";
     std::free(path);
     return result;
 }
