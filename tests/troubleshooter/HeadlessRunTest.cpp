@@ -76,13 +76,4 @@ TEST_F(HeadlessTroubleShooter, NoToTheOfferWritesNoLog)
     EXPECT_FALSE(std::filesystem::exists(LogPath()));
 }
 
-TEST_F(HeadlessTroubleShooter, EndOfInputEndsTheRun)
-{
-    Run(kNoTower, "Answer yes\nOpen\nHelp 2002\n");
-    const std::size_t at = Find("[help] topic IR_Transmitter_or_cable_not_connected");
-    Find("[help] closed", at);
-    EXPECT_NE(Log().find("\nTest Tower:\n"), std::string::npos);
-    EXPECT_NE(Log().find("\nTrouble Shooter closed\n"), std::string::npos);
-}
-
 } // namespace

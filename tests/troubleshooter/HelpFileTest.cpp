@@ -1,3 +1,4 @@
+// The help file the client ships, the document reader, and the headless viewer built on it.
 #include <gtest/gtest.h>
 
 #include <regex>
@@ -6,89 +7,68 @@
 #include <vector>
 
 #include "FakeWindowHost.h"
-#include "LogHelpers.h"
+#include "Fakes.h"
 #include "troubleshooter/HeadlessHelpViewer.h"
 #include "troubleshooter/HelpDocument.h"
 #include "troubleshooter/HelpLink.h"
 
 namespace {
 
-using Strings = std::vector<std::string>;
-
-const char* const kSuccessTopics[] = {"Found_working_IR_Transmitter", "IR_Transmitter_ok",
-                                      "Onyx_ok", "IR_Transmitter_range_set_ok",
-                                      "Found_working_COM_port"};
-
-std::set<std::string> RequiredTopics()
+std::string HelpDirectory()
 {
-    std::set<std::string> topics(std::begin(kSuccessTopics), std::end(kSuccessTopics));
-    for (int outcome = 1000; outcome < 1500; ++outcome) {
-        if (const char* topic = HelpLink::TopicOf(outcome)) {
-            topics.insert(topic);
-        }
-    }
-    return topics;
+    const std::string file = HARBOR_HELP_FILE;
+    return file.substr(0, file.rfind('/') + 1);
 }
 
-class ShooterHelpFile : public testing::Test {
-protected:
-    void SetUp() override { ASSERT_TRUE(document.Load(HARBOR_HELP_FILE)); }
-    HelpDocument document;
-};
-
-TEST_F(ShooterHelpFile, HasExactlyTheTopicsTheClientOpens)
+TEST(ShooterHelpFile, HasExactlyTheTopicsTheClientOpensAndEveryLinkLeadsSomewhere)
 {
-    const std::set<std::string> required = RequiredTopics();
+    HelpDocument document;
+    ASSERT_TRUE(document.Load(HARBOR_HELP_FILE));
+    std::set<std::string> required = {"Found_working_IR_Transmitter", "IR_Transmitter_ok",
+                                      "Onyx_ok", "IR_Transmitter_range_set_ok",
+                                      "Found_working_COM_port"};
+    for (int outcome = 1000; outcome < 1500; ++outcome) {
+        if (const char* topic = HelpLink::TopicOf(outcome)) {
+            required.insert(topic);
+        }
+    }
     EXPECT_EQ(required.size(), 26u);
     const Strings ids = document.TopicIds();
     EXPECT_EQ(std::set<std::string>(ids.begin(), ids.end()), required);
-}
 
-TEST_F(ShooterHelpFile, EveryLinkLeadsSomewhere)
-{
     const std::set<int> commands = {2000, 2001, 2002, 2003, 2004, 2006, 2007, 2008, 3001};
     const std::regex link("href=\"([^\"]*)\"");
-    for (const std::string& id : document.TopicIds()) {
+    for (const std::string& id : ids) {
+        SCOPED_TRACE(id);
         const std::string html = document.TopicHtml(id);
         bool closes = false;
         for (std::sregex_iterator it(html.begin(), html.end(), link), end; it != end; ++it) {
             const std::string href = (*it)[1];
+            SCOPED_TRACE(href);
             if (href[0] == '#') {
-                EXPECT_TRUE(document.HasTopic(href.substr(1))) << id << ": " << href;
+                EXPECT_TRUE(document.HasTopic(href.substr(1)));
                 continue;
             }
             int command = 0;
             std::int32_t argument = 0;
-            ASSERT_TRUE(HelpDocument::ParseCommandLink(href, &command, &argument))
-                << id << ": " << href;
-            EXPECT_EQ(commands.count(command), 1u) << id << ": " << href;
+            ASSERT_TRUE(HelpDocument::ParseCommandLink(href, &command, &argument));
+            EXPECT_EQ(commands.count(command), 1u);
             const bool takesArgument = command == 2004 || command == 2006 || command == 3001;
-            EXPECT_EQ(href.find('?') != std::string::npos, takesArgument) << id << ": " << href;
-            if (command == 2006) {
-                EXPECT_TRUE(argument >= 1 && argument <= 3) << id;
-            }
-            if (command == 3001) {
-                EXPECT_TRUE(argument == 1 || argument == 3) << id;
-            }
+            EXPECT_EQ(href.find('?') != std::string::npos, takesArgument);
+            EXPECT_TRUE(command != 2006 || (argument >= 1 && argument <= 3));
+            EXPECT_TRUE(command != 3001 || argument == 1 || argument == 3);
             closes = closes || command == 2000;
         }
-        EXPECT_TRUE(closes) << id << " offers no way to close";
-    }
-}
-
-TEST_F(ShooterHelpFile, TopicsReadAsGuidance)
-{
-    for (const std::string& id : document.TopicIds()) {
+        EXPECT_TRUE(closes) << "no way to close";
         const Strings text = document.TopicText(id);
-        ASSERT_GE(text.size(), 2u) << id;
+        EXPECT_GE(text.size(), 2u);
         for (const std::string& line : text) {
-            EXPECT_EQ(line.find('<'), std::string::npos) << id << ": " << line;
-            EXPECT_EQ(line.find("&"), std::string::npos) << id << ": " << line;
+            EXPECT_EQ(line.find_first_of("<&"), std::string::npos) << line;
         }
     }
 }
 
-TEST(HelpDocumentText, LinksShowWhatToType)
+TEST(HelpDocumentText, TopicsAreReadAsLinesWithWhatToType)
 {
     HelpDocument document;
     ASSERT_TRUE(document.Parse(
@@ -99,15 +79,10 @@ TEST(HelpDocumentText, LinksShowWhatToType)
     EXPECT_EQ(document.TopicIds(), (Strings{"A", "B"}));
     EXPECT_EQ(document.TopicText("A"),
               (Strings{"Title & more",
-                       "Go to COM3 [help 2004 3], or test [help 2002] or read B "
-                       "[topic B].",
+                       "Go to COM3 [help 2004 3], or test [help 2002] or read B [topic B].",
                        "- one", "- two"}));
     EXPECT_TRUE(document.TopicText("C").empty());
-}
-
-TEST(HelpDocumentText, FilesWithoutTopicsAreNotHelpFiles)
-{
-    HelpDocument document;
+    // Files without topics are no help files.
     EXPECT_FALSE(document.Parse("<html><body>nothing</body></html>"));
     EXPECT_FALSE(document.Parse(""));
     EXPECT_FALSE(document.Load("/nonexistent/shooter.hlp"));
@@ -116,22 +91,17 @@ TEST(HelpDocumentText, FilesWithoutTopicsAreNotHelpFiles)
     EXPECT_FALSE(document.Load(empty.path()));
 }
 
-TEST(HelpDocumentText, JumpMacro)
+TEST(HelpDocumentText, JumpMacrosAndCommandLinks)
 {
     std::string file;
     std::string topic;
     EXPECT_TRUE(HelpDocument::ParseJumpMacro("JI(\"shooter.hlp\",\"Onyx_ok\")", &file, &topic));
-    EXPECT_EQ(file, "shooter.hlp");
-    EXPECT_EQ(topic, "Onyx_ok");
+    EXPECT_EQ(file + "|" + topic, "shooter.hlp|Onyx_ok");
     for (const char* bad : {"JI(\"shooter.hlp\",\"\")", "JI(\"shooter.hlp\",\"x\"", "JI(\"a\")",
-                            "JumpId(\"a\",\"b\")", "", "JI(\"shooter.hlp\",\"x\") "}) {
-        EXPECT_FALSE(HelpDocument::ParseJumpMacro(bad, &file, &topic)) << bad;
+                            "JumpId(\"a\",\"b\")", "", "JI(\"shooter.hlp\",\"x\") ",
+                            static_cast<const char*>(nullptr)}) {
+        EXPECT_FALSE(HelpDocument::ParseJumpMacro(bad, &file, &topic)) << (bad ? bad : "<null>");
     }
-    EXPECT_FALSE(HelpDocument::ParseJumpMacro(nullptr, &file, &topic));
-}
-
-TEST(HelpDocumentText, CommandLinks)
-{
     int id = 0;
     std::int32_t argument = 99;
     EXPECT_TRUE(HelpDocument::ParseCommandLink("cmd:2002", &id, &argument));
@@ -147,44 +117,31 @@ TEST(HelpDocumentText, CommandLinks)
 
 class HeadlessViewer : public testing::Test {
 protected:
-    HeadlessViewer()
-        : viewer(
-              host, [this](const std::string& line) { printed.push_back(line); }, HelpDirectory())
-    {
-    }
-    static std::string HelpDirectory()
-    {
-        const std::string file = HARBOR_HELP_FILE;
-        return file.substr(0, file.rfind('/') + 1);
-    }
-    ui::WindowHandle Owner()
-    {
-        owner = host.CreatePlainWindow("trbl_wnd", &sink);
-        return owner;
-    }
-
     struct Sink : ui::WindowObject {
         std::vector<std::pair<int, ui::LParam>> commands;
         bool OnMessage(ui::Message message, ui::WParam wParam, ui::LParam lParam,
-                       ui::LResult& result) override
+                       ui::LResult&) override
         {
             if (message == ui::kMsgCommand) {
                 commands.emplace_back(ui::CommandId(wParam), lParam);
             }
             return true;
         }
-    } sink;
+    };
+
     FakeWindowHost host;
     Strings printed;
-    HeadlessHelpViewer viewer;
-    ui::WindowHandle owner = ui::kNoWindow;
+    HeadlessHelpViewer viewer{host, [this](const std::string& line) { printed.push_back(line); },
+                              HelpDirectory()};
+    Sink sink;
+    const ui::WindowHandle owner = host.CreatePlainWindow("trbl_wnd", &sink);
+    const char* const onyxOk = "JI(\"shooter.hlp\",\"Onyx_ok\")";
 };
 
 TEST_F(HeadlessViewer, PrintsTheTopicAndSendsCommandsToItsOwner)
 {
-    const ui::WindowHandle window = Owner();
-    EXPECT_EQ(viewer.OpenFile(window, "shooter.hlp"), 1);
-    EXPECT_EQ(viewer.RunMacro(window, "shooter.hlp", "JI(\"shooter.hlp\",\"IR_Transmitter_ok\")"),
+    EXPECT_EQ(viewer.OpenFile(owner, "shooter.hlp"), 1);
+    EXPECT_EQ(viewer.RunMacro(owner, "shooter.hlp", "JI(\"shooter.hlp\",\"IR_Transmitter_ok\")"),
               1);
     EXPECT_EQ(viewer.currentTopic(), "IR_Transmitter_ok");
     ASSERT_GE(printed.size(), 4u);
@@ -192,23 +149,19 @@ TEST_F(HeadlessViewer, PrintsTheTopicAndSendsCommandsToItsOwner)
     EXPECT_EQ(printed[1], "[help] topic IR_Transmitter_ok");
     EXPECT_EQ(printed[2], "[help]   The tower is working");
     EXPECT_EQ(printed.back(), "[help]   Test the brick [help 2003] - Close [help 2000]");
+    EXPECT_EQ(viewer.RunMacro(owner, "shooter.hlp", "JI(\"shooter.hlp\",\"Nowhere\")"), 0);
+    EXPECT_EQ(printed.back(), "[help] no topic Nowhere");
+    EXPECT_TRUE(viewer.ShowTopic("Onyx_ok"));
 
     EXPECT_TRUE(viewer.Command(2004, 3));
-    host.PumpMessage();
-    ASSERT_EQ(sink.commands.size(), 1u);
-    EXPECT_EQ(sink.commands[0], std::make_pair(2004, static_cast<ui::LParam>(3)));
-}
-
-TEST_F(HeadlessViewer, EndOfInputClosesTheHelpOnce)
-{
-    const ui::WindowHandle window = Owner();
-    viewer.OpenFile(window, "shooter.hlp");
+    // The end of the input closes the help, once.
     viewer.InputEnded();
     viewer.InputEnded();
-    host.PumpMessage();
-    EXPECT_EQ(sink.commands.size(), 1u);
-    EXPECT_EQ(sink.commands[0].first, 2000);
-    EXPECT_EQ(viewer.Quit(window, "shooter.hlp"), 1);
+    while (!host.queue.empty()) {
+        host.PumpMessage();
+    }
+    EXPECT_EQ(sink.commands, (std::vector<std::pair<int, ui::LParam>>{{2004, 3}, {2000, 0}}));
+    EXPECT_EQ(viewer.Quit(owner, "shooter.hlp"), 1);
     EXPECT_FALSE(viewer.IsOpen());
     EXPECT_EQ(printed.back(), "[help] closed");
     EXPECT_FALSE(viewer.Command(2002, 0));
@@ -216,19 +169,17 @@ TEST_F(HeadlessViewer, EndOfInputClosesTheHelpOnce)
 
 TEST_F(HeadlessViewer, ANewOwnerTakesTheViewerOver)
 {
-    const ui::WindowHandle first = Owner();
     Sink second;
     const ui::WindowHandle later = host.CreatePlainWindow("trbl_wnd", &second);
-    EXPECT_EQ(viewer.OpenFile(first, "shooter.hlp"), 1);
+    EXPECT_EQ(viewer.OpenFile(owner, "shooter.hlp"), 1);
     EXPECT_EQ(viewer.OpenFile(later, "shooter.hlp"), 1);
     host.PumpMessage();
-    ASSERT_EQ(sink.commands.size(), 1u);
-    EXPECT_EQ(sink.commands[0].first, 2000);
+    EXPECT_EQ(sink.commands, (std::vector<std::pair<int, ui::LParam>>{{2000, 0}}));
     // The first owner's own close and topics no longer touch the viewer.
-    EXPECT_EQ(viewer.RunMacro(first, "shooter.hlp", "JI(\"shooter.hlp\",\"Onyx_ok\")"), 0);
-    EXPECT_EQ(viewer.Quit(first, "shooter.hlp"), 1);
+    EXPECT_EQ(viewer.RunMacro(owner, "shooter.hlp", onyxOk), 0);
+    EXPECT_EQ(viewer.Quit(owner, "shooter.hlp"), 1);
     EXPECT_TRUE(viewer.IsOpen());
-    EXPECT_EQ(viewer.RunMacro(later, "shooter.hlp", "JI(\"shooter.hlp\",\"Onyx_ok\")"), 1);
+    EXPECT_EQ(viewer.RunMacro(later, "shooter.hlp", onyxOk), 1);
     EXPECT_TRUE(viewer.Command(2002, 0));
     host.PumpMessage();
     EXPECT_EQ(second.commands.size(), 1u);
@@ -239,18 +190,10 @@ TEST_F(HeadlessViewer, ANewOwnerTakesTheViewerOver)
 TEST_F(HeadlessViewer, MissingFileFailsToOpen)
 {
     HeadlessHelpViewer elsewhere(host, nullptr, "/nonexistent/");
-    EXPECT_EQ(elsewhere.OpenFile(Owner(), "shooter.hlp"), 0);
+    EXPECT_EQ(elsewhere.OpenFile(owner, "shooter.hlp"), 0);
     EXPECT_FALSE(elsewhere.IsOpen());
-    EXPECT_EQ(elsewhere.RunMacro(owner, "shooter.hlp", "JI(\"shooter.hlp\",\"Onyx_ok\")"), 0);
+    EXPECT_EQ(elsewhere.RunMacro(owner, "shooter.hlp", onyxOk), 0);
     EXPECT_FALSE(elsewhere.Command(2000, 0));
-}
-
-TEST_F(HeadlessViewer, UnknownTopicIsReported)
-{
-    viewer.OpenFile(Owner(), "shooter.hlp");
-    EXPECT_EQ(viewer.RunMacro(owner, "shooter.hlp", "JI(\"shooter.hlp\",\"Nowhere\")"), 0);
-    EXPECT_EQ(printed.back(), "[help] no topic Nowhere");
-    EXPECT_TRUE(viewer.ShowTopic("Onyx_ok"));
 }
 
 } // namespace

@@ -1,28 +1,21 @@
+// The help protocol of a run: the hidden window, the outcome topics, and the help file's
+// commands running tests whose results open the next topic.
 #include <gtest/gtest.h>
 
 #include <string>
 #include <vector>
 
-#include "FakeBrickCalls.h"
 #include "FakeWindowHost.h"
-#include "LogHelpers.h"
-#include "RecordingViewer.h"
+#include "Fakes.h"
 #include "platform/SystemInfoScripted.h"
 #include "troubleshooter/HelpLink.h"
 #include "troubleshooter/TroubleShooter.h"
 
 namespace {
 
-using Strings = std::vector<std::string>;
-
 std::string Jump(const char* topic)
 {
     return std::string("JI(\"shooter.hlp\",\"") + topic + "\")";
-}
-
-constexpr std::int32_t Packed(std::uint32_t value)
-{
-    return static_cast<std::int32_t>(value);
 }
 
 class HelpProtocol : public testing::Test {
@@ -44,37 +37,30 @@ protected:
     TroubleShooter shooter{&calls, &handle, log.path(), &system};
 };
 
-TEST_F(HelpProtocol, LinkOwnsOneHiddenWindowOfItsClass)
+TEST_F(HelpProtocol, LinkOwnsOneHiddenWindowAndClosesAnOpenHelpWhenItGoes)
 {
     {
         HelpLink link(&shooter, host, &viewer);
         ASSERT_NE(link.window(), ui::kNoWindow);
         EXPECT_EQ(host.windows.at(link.window()).first, "trbl_wnd");
         EXPECT_FALSE(link.HelpOpen());
+        link.ShowOutcome(1001);
     }
     EXPECT_TRUE(host.windows.empty());
     EXPECT_EQ(host.destroyed, 1);
-    EXPECT_TRUE(viewer.calls.empty());
+    EXPECT_EQ(viewer.calls.back(), "quit shooter.hlp");
 }
 
 TEST_F(HelpProtocol, ShowOutcomeOpensTheFileOnceAndShowsTheTopic)
 {
     HelpLink link(&shooter, host, &viewer);
-    EXPECT_TRUE(link.ShowOutcome(1011));
+    EXPECT_FALSE(link.ShowOutcome(1310)) << "no topic, but the help opens";
     EXPECT_TRUE(link.HelpOpen());
+    EXPECT_TRUE(link.ShowOutcome(1011));
     EXPECT_TRUE(link.ShowOutcome(1203));
     EXPECT_EQ(viewer.calls, (Strings{"open shooter.hlp", "macro " + Jump("Download_interrupted"),
                                      "macro " + Jump("COM_port_invalid")}));
     EXPECT_EQ(viewer.lastOwner, link.window());
-}
-
-TEST_F(HelpProtocol, OutcomeWithoutTopicStillOpensTheHelp)
-{
-    HelpLink link(&shooter, host, &viewer);
-    EXPECT_FALSE(link.ShowOutcome(1310));
-    EXPECT_FALSE(link.ShowOutcome(1205));
-    EXPECT_TRUE(link.HelpOpen());
-    EXPECT_EQ(viewer.calls, Strings{"open shooter.hlp"});
 }
 
 TEST_F(HelpProtocol, OnlyAnAnswerOfExactlyOneOpensTheHelp)
@@ -85,25 +71,17 @@ TEST_F(HelpProtocol, OnlyAnAnswerOfExactlyOneOpensTheHelp)
         HelpLink link(&shooter, host, &refusing);
         EXPECT_TRUE(link.ShowOutcome(1001));
         EXPECT_FALSE(link.HelpOpen()) << answer;
-        // The next outcome tries to open the file again.
         link.ShowOutcome(1001);
-        EXPECT_EQ(refusing.calls.size(), 4u);
+        EXPECT_EQ(refusing.calls.size(), 4u) << "the next outcome tries to open it again";
     }
-}
-
-TEST_F(HelpProtocol, WithoutViewerNothingOpens)
-{
-    HelpLink link(&shooter, host, nullptr);
-    EXPECT_TRUE(link.ShowOutcome(1001));
-    EXPECT_FALSE(link.HelpOpen());
+    HelpLink without(&shooter, host, nullptr);
+    EXPECT_TRUE(without.ShowOutcome(1001));
+    EXPECT_FALSE(without.HelpOpen());
 }
 
 TEST_F(HelpProtocol, TopicTableCoversEveryOutcomeGroup)
 {
-    const struct {
-        int outcome;
-        const char* topic;
-    } expected[] = {
+    const std::pair<int, const char*> expected[] = {
         {1001, "IR_Transmitter_not_found"},
         {1002, "IR_Transmitter_or_cable_not_connected"},
         {1003, "IR_Transmitter_not_working"},
@@ -127,34 +105,39 @@ TEST_F(HelpProtocol, TopicTableCoversEveryOutcomeGroup)
         {1301, "Error_in_program"},
         {1309, "Error_in_program"},
         {1401, "Missing_system_component"},
-        {1410, "Missing_system_component"},
-    };
-    for (const auto& entry : expected) {
-        ASSERT_NE(HelpLink::TopicOf(entry.outcome), nullptr) << entry.outcome;
-        EXPECT_STREQ(HelpLink::TopicOf(entry.outcome), entry.topic);
+        {1410, "Missing_system_component"}};
+    for (const auto& [outcome, topic] : expected) {
+        ASSERT_NE(HelpLink::TopicOf(outcome), nullptr) << outcome;
+        EXPECT_STREQ(HelpLink::TopicOf(outcome), topic);
     }
     for (int none : {0, 1000, 1013, 1100, 1106, 1200, 1205, 1300, 1310, 1400, 1411}) {
         EXPECT_EQ(HelpLink::TopicOf(none), nullptr) << none;
     }
 }
 
-TEST_F(HelpProtocol, TestComPortThreeOpensFoundTowerOnSuccess)
+TEST_F(HelpProtocol, EachTestOpensItsSuccessTopic)
 {
     HelpLink link(&shooter, host, &viewer);
+    calls.findPortAnswers = {{0, "COM1"}};
     calls.enumAnswers[3] = {{0, 1, "COM1"}, {0, 3, "COM3"}};
-    EXPECT_EQ(link.HandleHelpCommand(2004, 3), 0);
-    EXPECT_EQ(calls.calls[4], "Create(COM3)");
-    EXPECT_EQ(viewer.Macros(), Strings{Jump("Found_working_IR_Transmitter")});
-    EXPECT_EQ(log.body(), "\nTest serial tower:\n\tTest COM port COM3: ok\n\tCreate port COM3 ok\n"
-                          "\tSet brick type ok\n\tPort status ok\n");
-}
-
-TEST_F(HelpProtocol, ComPortNumberIsTheLowSixteenBitsOfTheArgument)
-{
-    HelpLink link(&shooter, host, &viewer);
-    calls.enumAnswers[3] = {{0, 1, "COM1"}, {0, 3, "COM3"}};
-    link.HandleHelpCommand(2004, 0x70003);
-    EXPECT_EQ(calls.calls[4], "Create(COM3)");
+    calls.enumAnswers[4] = {{0, 1, "KIVOTOWER1"}};
+    const std::pair<int, ui::LParam> commands[] = {{2001, 0}, {2002, 0}, {2003, 0},      {2006, 2},
+                                                   {2007, 0}, {2008, 0}, {2004, 0x70003}};
+    for (const auto& [id, argument] : commands) {
+        EXPECT_EQ(link.HandleHelpCommand(id, argument), 0) << id;
+    }
+    EXPECT_EQ(
+        viewer.Macros(),
+        (Strings{Jump("Found_working_IR_Transmitter"), Jump("IR_Transmitter_ok"), Jump("Onyx_ok"),
+                 Jump("IR_Transmitter_range_set_ok"), Jump("Found_working_COM_port"),
+                 Jump("Found_working_IR_Transmitter"), Jump("Found_working_IR_Transmitter")}));
+    const std::string body = log.body();
+    EXPECT_NE(body.find("\nFind Tower:\n"), std::string::npos);
+    EXPECT_NE(body.find("\nFind USB Tower:\n\tEnum USB ports ok\n"), std::string::npos);
+    EXPECT_NE(body.find("\nSet USB Range:\n\tSet range ok\n"), std::string::npos);
+    // The port number is the low sixteen bits of the argument.
+    EXPECT_NE(body.find("\nTest serial tower:\n\tTest COM port COM3: ok\n\tCreate port COM3 ok\n"),
+              std::string::npos);
 }
 
 TEST_F(HelpProtocol, PortTypeCommandDecidesTheNextNoMoreItemsJump)
@@ -172,48 +155,17 @@ TEST_F(HelpProtocol, PortTypeCommandDecidesTheNextNoMoreItemsJump)
     EXPECT_FALSE(host.quit);
 }
 
-TEST_F(HelpProtocol, CloseEndsThePumpOfTheDiagnosis)
-{
-    HelpLink link(&shooter, host, &viewer);
-    Send(2000);
-    EXPECT_TRUE(shooter.Diagnose(Packed(0xE0050401u), &link));
-    EXPECT_EQ(viewer.calls,
-              (Strings{"open shooter.hlp", "macro " + Jump("IR_Transmitter_not_found"),
-                       "quit shooter.hlp"}));
-    EXPECT_EQ(host.pumps, 1);
-}
-
-TEST_F(HelpProtocol, FailedTestJumpsToItsOwnOutcome)
+TEST_F(HelpProtocol, FailedTestJumpsToItsOwnOutcomeAndCloseEndsThePump)
 {
     HelpLink link(&shooter, host, &viewer);
     calls.lastStatus[3] = 4; // the brick's status: no tower
     Send(2003);
     Send(2000);
-    shooter.Diagnose(Packed(0xE0050402u), &link);
-    EXPECT_EQ(viewer.Macros(),
-              (Strings{Jump("Onyx_not_alive"), Jump("IR_Transmitter_or_cable_not_connected")}));
-}
-
-TEST_F(HelpProtocol, EachTestOpensItsSuccessTopic)
-{
-    HelpLink link(&shooter, host, &viewer);
-    calls.findPortAnswers = {{0, "COM1"}};
-    calls.enumAnswers[3] = {{0, 1, "COM1"}};
-    calls.enumAnswers[4] = {{0, 1, "KIVOTOWER1"}};
-    link.HandleHelpCommand(2001, 0);
-    link.HandleHelpCommand(2002, 0);
-    link.HandleHelpCommand(2003, 0);
-    link.HandleHelpCommand(2006, 2);
-    link.HandleHelpCommand(2007, 0);
-    link.HandleHelpCommand(2008, 0);
-    EXPECT_EQ(viewer.Macros(),
-              (Strings{Jump("Found_working_IR_Transmitter"), Jump("IR_Transmitter_ok"),
-                       Jump("Onyx_ok"), Jump("IR_Transmitter_range_set_ok"),
-                       Jump("Found_working_COM_port"), Jump("Found_working_IR_Transmitter")}));
-    const std::string body = log.body();
-    EXPECT_NE(body.find("\nFind Tower:\n"), std::string::npos);
-    EXPECT_NE(body.find("\nFind USB Tower:\n\tEnum USB ports ok\n"), std::string::npos);
-    EXPECT_NE(body.find("\nSet USB Range:\n\tSet range ok\n"), std::string::npos);
+    EXPECT_TRUE(shooter.Diagnose(Packed(0xE0050402u), &link));
+    EXPECT_EQ(viewer.calls, (Strings{"open shooter.hlp", "macro " + Jump("Onyx_not_alive"),
+                                     "macro " + Jump("IR_Transmitter_or_cable_not_connected"),
+                                     "quit shooter.hlp"}));
+    EXPECT_EQ(host.pumps, 2);
 }
 
 TEST_F(HelpProtocol, RepairedUsbTowerLetsTheArgumentStand)
@@ -234,29 +186,22 @@ TEST_F(HelpProtocol, RepairedUsbTowerLetsTheArgumentStand)
     EXPECT_EQ(log.body().find("Enum USB ports"), std::string::npos);
 }
 
-TEST_F(HelpProtocol, UnknownCommandsDoNothing)
+TEST_F(HelpProtocol, UnknownCommandsAndCommandsWithoutTroubleShooterDoNothing)
 {
-    HelpLink link(&shooter, host, &viewer);
     calls.forbidCalls = true;
+    HelpLink link(&shooter, host, &viewer);
     for (int id : {1999, 2005, 2009, 3000, 3002, 0}) {
         EXPECT_EQ(link.HandleHelpCommand(id, 1), 0);
     }
-    EXPECT_TRUE(viewer.calls.empty());
-    EXPECT_EQ(log.body(), "");
-}
-
-TEST_F(HelpProtocol, WithoutTroubleShooterOnlyCloseActs)
-{
-    HelpLink link(nullptr, host, &viewer);
-    calls.forbidCalls = true;
+    HelpLink orphan(nullptr, host, &viewer);
     for (int id : {2001, 2002, 2003, 2004, 2006, 2007, 2008, 3001}) {
-        link.HandleHelpCommand(id, 3);
+        orphan.HandleHelpCommand(id, 3);
     }
     EXPECT_TRUE(viewer.calls.empty());
-    link.ShowOutcome(1001);
-    link.HandleHelpCommand(2000, 0);
-    EXPECT_FALSE(link.HelpOpen());
-    EXPECT_EQ(viewer.calls.back(), "quit shooter.hlp");
+    EXPECT_EQ(log.body(), "");
+    orphan.ShowOutcome(1001);
+    orphan.HandleHelpCommand(2000, 0);
+    EXPECT_FALSE(orphan.HelpOpen()) << "only close acts";
 }
 
 TEST_F(HelpProtocol, CommandMessagesReachTheLinkThroughItsWindow)
@@ -265,10 +210,7 @@ TEST_F(HelpProtocol, CommandMessagesReachTheLinkThroughItsWindow)
     link.ShowOutcome(1001);
     EXPECT_EQ(host.SendMessage(link.window(), ui::kMsgCommand, ui::MakeCommand(2000, 1), 0), 0);
     EXPECT_FALSE(link.HelpOpen());
-    // Other messages are left to the default processing.
-    ui::LResult result = 7;
-    EXPECT_EQ(host.SendMessage(link.window(), 0x0200, 0, 0), 0);
-    EXPECT_EQ(result, 7);
+    EXPECT_EQ(host.SendMessage(link.window(), 0x0200, 0, 0), 0) << "others: default processing";
 }
 
 TEST_F(HelpProtocol, QuitRequestEndsTheRunAndStaysPending)
@@ -281,7 +223,7 @@ TEST_F(HelpProtocol, QuitRequestEndsTheRunAndStaysPending)
     EXPECT_EQ(viewer.calls.back(), "quit shooter.hlp");
 }
 
-TEST_F(HelpProtocol, MissingHelpFileEndsTheRunAtOnceWithTheDiagnosisLogged)
+TEST_F(HelpProtocol, MissingHelpFileOrWindowEndsTheRunAtOnce)
 {
     viewer.openAnswer = 0;
     HelpLink link(&shooter, host, &viewer);
@@ -290,27 +232,16 @@ TEST_F(HelpProtocol, MissingHelpFileEndsTheRunAtOnceWithTheDiagnosisLogged)
     shooter.CloseLog();
     EXPECT_NE(log.body().find("\tDiagnosing Error failed:\n"), std::string::npos);
     EXPECT_NE(log.body().find("\nTrouble Shooter closed\n"), std::string::npos);
-}
 
-TEST_F(HelpProtocol, WithoutItsWindowTheHelpNeverOpens)
-{
     host.refuseWindows = true;
-    HelpLink link(&shooter, host, &viewer);
-    EXPECT_EQ(link.window(), ui::kNoWindow);
-    EXPECT_TRUE(shooter.Diagnose(Packed(0xE0050421u), &link));
-    EXPECT_FALSE(link.HelpOpen());
+    RecordingViewer unowned;
+    HelpLink windowless(&shooter, host, &unowned);
+    EXPECT_EQ(windowless.window(), ui::kNoWindow);
+    EXPECT_TRUE(shooter.Diagnose(Packed(0xE0050421u), &windowless));
+    EXPECT_FALSE(windowless.HelpOpen());
     EXPECT_EQ(host.pumps, 0);
-    EXPECT_EQ(viewer.Macros(), Strings{Jump("IR_Transmitter_or_cable_not_connected")});
-    EXPECT_EQ(viewer.calls.front().rfind("open", 0), std::string::npos);
-}
-
-TEST_F(HelpProtocol, LinkClosesAHelpStillOpenWhenItGoes)
-{
-    {
-        HelpLink link(&shooter, host, &viewer);
-        link.ShowOutcome(1001);
-    }
-    EXPECT_EQ(viewer.calls.back(), "quit shooter.hlp");
+    EXPECT_EQ(unowned.Macros(), Strings{Jump("IR_Transmitter_or_cable_not_connected")});
+    EXPECT_NE(unowned.calls.front().rfind("open", 0), 0u) << "no file opened without a window";
 }
 
 } // namespace

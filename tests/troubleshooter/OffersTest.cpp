@@ -8,6 +8,7 @@
 #include <utility>
 #include <vector>
 
+#include "Fakes.h"
 #include "SimulatorFixture.h"
 #include "troubleshooter/HeadlessHelpViewer.h"
 #include "ui/TestClientDialog.h"
@@ -15,18 +16,14 @@
 
 namespace {
 
-using Strings = std::vector<std::string>;
-
-constexpr std::int32_t Packed(std::uint32_t value)
-{
-    return static_cast<std::int32_t>(value);
-}
-
 std::string HelpDirectory()
 {
     const std::string file = HARBOR_HELP_FILE;
     return file.substr(0, file.rfind('/') + 1);
 }
+
+// A "link" that starts a second run with its argument as the error.
+constexpr int kNestedRun = -1;
 
 class TroubleShooterOffers : public SimulatorFixture {
 protected:
@@ -109,11 +106,83 @@ protected:
     Strings printed;
     Strings questions;
     bool nestedResult = false;
-    // A "link" that starts a second run with its argument as the error.
-    static constexpr int kNestedRun = -1;
 };
 
 constexpr char kSerialBench[] = "[brick onyx2]\n[port COM1]\n[port COM3]\n";
+
+// A yes to the offer: the topics the run showed as the help's links were followed, and a part
+// of the log it left.
+struct Run {
+    const char* name;
+    const char* scenario;
+    std::uint32_t error; // below 100: a status offered with its text
+    std::deque<std::pair<int, std::int32_t>> links;
+    Strings topics;
+    const char* logged;
+};
+
+class TroubleShooterRuns : public TroubleShooterOffers, public testing::WithParamInterface<Run> {};
+
+TEST_P(TroubleShooterRuns, ShowTheTopicsOfTheLinksFollowedAndEndCleanly)
+{
+    const Run& run = GetParam();
+    StartDialog(run.scenario, "Serial=COM1");
+    links = run.links;
+    host_->QueueAnswer(true);
+    EXPECT_TRUE(run.error < 100
+                    ? dialog().OfferTroubleShooterForStatus(static_cast<int>(run.error), "dead")
+                    : dialog().OfferTroubleShooter(Packed(run.error)));
+    EXPECT_EQ(Topics(), run.topics);
+    EXPECT_NE(Log().find(run.logged), std::string::npos) << Log();
+    EXPECT_EQ(printed.back(), "[help] closed");
+    for (const auto& link : run.links) {
+        EXPECT_TRUE(link.first != kNestedRun || nestedResult) << "the second run showed a topic";
+    }
+    ExpectRunEndedCleanly();
+}
+
+INSTANTIATE_TEST_SUITE_P(
+    Offers, TroubleShooterRuns,
+    testing::Values(
+        Run{"NoTowerOpensItsTopic",
+            kSerialBench,
+            0xE0050421u,
+            {},
+            {"IR_Transmitter_or_cable_not_connected"},
+            "\tDiagnosing Error failed:\n\t\tError (0xe0050421) from Tessel driver: "
+            "IDSTATUS_RESULT_NOTOWER\n\nGet Tower Type:\n\tGet port name ok\n\tPort 1 is COM1\n"},
+        Run{"StatusIsConvertedBeforeTheDiagnosis",
+            "[brick onyx2]\nalive = no\n[port COM1]\n",
+            6,
+            {},
+            {"Onyx_not_alive"},
+            "\tDiagnosing Error failed:\n"},
+        Run{"TestComPortThreeFindsTheTower",
+            kSerialBench,
+            0xE0050421u,
+            {{2004, 3}, {2000, 0}},
+            {"IR_Transmitter_or_cable_not_connected", "Found_working_IR_Transmitter"},
+            "\nTest serial tower:\n\tTest COM port COM3: ok\n\tCreate port COM3 ok\n"},
+        Run{"PortTypeCommandTurnsNoMoreItemsIntoAUsbFault",
+            "[brick onyx2]\n[port COM1]\nstate = in-use\n",
+            0xE0050421u,
+            {{2007, 0}, {3001, 3}, {2007, 0}, {2000, 0}},
+            {"IR_Transmitter_or_cable_not_connected", "IR_Transmitter_or_cable_not_connected",
+             "USB_Transmitter_not_installed"},
+            "\tEnum COM ports failed:\n"},
+        Run{"EndOfTheHelpInputClosesTheHelp",
+            kSerialBench,
+            0xE0050402u,
+            {{2002, 0}, {2003, 0}},
+            {"Onyx_not_alive", "IR_Transmitter_ok", "Onyx_ok"},
+            "\nTest Onyx:\n"},
+        Run{"ASecondRunTakesTheHelpOverAndBothEnd",
+            kSerialBench,
+            0xE0050421u,
+            {{kNestedRun, Packed(0xE0050402u)}, {2003, 0}, {2000, 0}},
+            {"IR_Transmitter_or_cable_not_connected", "Onyx_not_alive", "Onyx_ok"},
+            "\tOnyx ok\n"}),
+    [](const testing::TestParamInfo<Run>& info) { return std::string(info.param.name); });
 
 TEST_F(TroubleShooterOffers, NoToEitherQuestionLeavesTheLogUntouched)
 {
@@ -131,77 +200,13 @@ TEST_F(TroubleShooterOffers, NoToEitherQuestionLeavesTheLogUntouched)
     EXPECT_TRUE(printed.empty());
 }
 
-TEST_F(TroubleShooterOffers, YesOpensTheTopicOfTheOutcome)
-{
-    StartDialog(kSerialBench, "Serial=COM1");
-    host_->QueueAnswer(true);
-    EXPECT_TRUE(dialog().OfferTroubleShooter(Packed(0xE0050421u)));
-    EXPECT_EQ(Topics(), Strings{"IR_Transmitter_or_cable_not_connected"});
-    ExpectRunEndedCleanly();
-    EXPECT_NE(Log().find("\tDiagnosing Error failed:\n\t\tError (0xe0050421) from Tessel driver: "
-                         "IDSTATUS_RESULT_NOTOWER\n\nGet Tower Type:\n\tGet port name ok\n"
-                         "\tPort 1 is COM1\n"),
-              std::string::npos);
-}
-
-TEST_F(TroubleShooterOffers, StatusOfferDiagnosesTheConvertedStatus)
-{
-    StartDialog("[brick onyx2]\nalive = no\n[port COM1]\n", "Serial=COM1");
-    host_->QueueAnswer(true);
-    EXPECT_TRUE(dialog().OfferTroubleShooterForStatus(6, "brick does not answer"));
-    EXPECT_EQ(Topics(), Strings{"Onyx_not_alive"});
-    ExpectRunEndedCleanly();
-}
-
-TEST_F(TroubleShooterOffers, TestComPortThreeFindsTheTower)
+TEST_F(TroubleShooterOffers, TheDialogGoesOnWithThePortATestOpened)
 {
     StartDialog(kSerialBench, "Serial=COM1");
     links = {{2004, 3}, {2000, 0}};
     host_->QueueAnswer(true);
     EXPECT_TRUE(dialog().OfferTroubleShooter(Packed(0xE0050421u)));
-    EXPECT_EQ(Topics(),
-              (Strings{"IR_Transmitter_or_cable_not_connected", "Found_working_IR_Transmitter"}));
-    EXPECT_NE(Log().find("\nTest serial tower:\n\tTest COM port COM3: ok\n\tCreate port COM3 ok\n"),
-              std::string::npos);
-    // The dialog goes on with the port the test opened.
     EXPECT_NE(dialog().brickHandle(), 0);
-    ExpectRunEndedCleanly();
-}
-
-TEST_F(TroubleShooterOffers, PortTypeCommandTurnsNoMoreItemsIntoAUsbFault)
-{
-    StartDialog("[brick onyx2]\n[port COM1]\nstate = in-use\n", "Serial=COM1");
-    ASSERT_EQ(dialog().brickHandle(), 0);
-    links = {{2007, 0}, {3001, 3}, {2007, 0}, {2000, 0}};
-    host_->QueueAnswer(true);
-    EXPECT_TRUE(dialog().OfferTroubleShooter(Packed(0xE0050421u)));
-    EXPECT_EQ(Topics(),
-              (Strings{"IR_Transmitter_or_cable_not_connected",
-                       "IR_Transmitter_or_cable_not_connected", "USB_Transmitter_not_installed"}));
-    ExpectRunEndedCleanly();
-}
-
-TEST_F(TroubleShooterOffers, EndOfTheHelpInputClosesTheHelp)
-{
-    StartDialog(kSerialBench, "Serial=COM1");
-    links = {{2002, 0}, {2003, 0}};
-    host_->QueueAnswer(true);
-    EXPECT_TRUE(dialog().OfferTroubleShooter(Packed(0xE0050402u)));
-    EXPECT_EQ(Topics(), (Strings{"Onyx_not_alive", "IR_Transmitter_ok", "Onyx_ok"}));
-    EXPECT_EQ(printed.back(), "[help] closed");
-    ExpectRunEndedCleanly();
-}
-
-TEST_F(TroubleShooterOffers, ASecondRunTakesTheHelpOverAndBothEnd)
-{
-    StartDialog(kSerialBench, "Serial=COM1");
-    links = {{kNestedRun, Packed(0xE0050402u)}, {2003, 0}, {2000, 0}};
-    host_->QueueAnswer(true);
-    EXPECT_TRUE(dialog().OfferTroubleShooter(Packed(0xE0050421u)));
-    EXPECT_TRUE(nestedResult);
-    EXPECT_EQ(Topics(),
-              (Strings{"IR_Transmitter_or_cable_not_connected", "Onyx_not_alive", "Onyx_ok"}));
-    ExpectRunEndedCleanly();
 }
 
 TEST_F(TroubleShooterOffers, MissingHelpFileEndsTheRunWithTheDiagnosisLogged)

@@ -4,7 +4,7 @@
 #include <string>
 #include <vector>
 
-#include "LogHelpers.h"
+#include "Fakes.h"
 #include "SimulatorFixture.h"
 #include "errors/ErrorText.h"
 #include "platform/SystemInfoScripted.h"
@@ -12,47 +12,6 @@
 #include "troubleshooter/TroubleShooter.h"
 
 namespace {
-
-constexpr std::int32_t Packed(std::uint32_t value)
-{
-    return static_cast<std::int32_t>(value);
-}
-
-// Fails the test at any call: proves that nothing reached the library.
-class ForbiddingCalls final : public BrickCalls {
-public:
-    tessel::Long FindPort(char*, tessel::Size) override { return Forbidden(); }
-    tessel::Long Create(const char*) override { return Forbidden(); }
-    int Destroy(tessel::Long) override { return Forbidden(); }
-    tessel::Long Status(tessel::Long, tessel::Short, char*, tessel::Size) override
-    {
-        return Forbidden();
-    }
-    tessel::Long Set(tessel::Long, tessel::Short, tessel::Short) override { return Forbidden(); }
-    tessel::Long Get(tessel::Long, tessel::Short, tessel::Short*, char*, tessel::Size) override
-    {
-        return Forbidden();
-    }
-    tessel::Long FindFirst(tessel::Short, tessel::Short*, char*, tessel::Size) override
-    {
-        return Forbidden();
-    }
-    tessel::Long FindNext(tessel::Short, tessel::Short*, char*, tessel::Size) override
-    {
-        return Forbidden();
-    }
-    tessel::Long RunImmediate(tessel::Long, const char*, tessel::Long*) override
-    {
-        return Forbidden();
-    }
-
-private:
-    static int Forbidden()
-    {
-        ADD_FAILURE() << "a library call was made";
-        return -1;
-    }
-};
 
 class SimulatedDiagnosis : public SimulatorFixture {
 protected:
@@ -114,63 +73,44 @@ TEST_F(SimulatedDiagnosis, ComPortNamedInsteadOfTheUsbTower)
     EXPECT_NE(Body().find("\nFind USB Tower:\n\tFind port ok\n\tFind USB tower failed:\n"
                           "\t\tError (0xe0050444) from Tessel driver: no more ports found\n"),
               std::string::npos);
-    // The search closed the old port and opened none.
-    EXPECT_EQ(handle, 0);
+    EXPECT_EQ(handle, 0) << "the search closed the old port and opened none";
 }
 
-TEST_F(SimulatedDiagnosis, NoMoreItemsOnAUsbTower)
+// Outcomes that depend on the port type or have no catalogue text, and a facility that has
+// no outcome at all, which is logged under its jump label instead.
+TEST_F(SimulatedDiagnosis, OutcomeEdgeCases)
 {
+    struct Case {
+        const char* port;
+        std::uint32_t error;
+        std::vector<int> shown;
+        const char* logged;
+    };
+    const Case cases[] = {
+        {"KIVOTOWER1", 0xE0050C52u, {1102}, nullptr},
+        {"COM1", 0xE0050C52u, {1002}, nullptr},
+        {"KIVOTOWER1",
+         0xE0050476u,
+         {1103},
+         "\tDiagnosing Error failed:\n\t\tError (0xe0050476) from Tessel driver: "},
+        {"COM1",
+         0xE0030010u,
+         {},
+         "\tJump facility failed:\n\t\tError (0xe0030010) from Opal: undefined label\n"},
+    };
     Start("[brick onyx2]\n[port KIVOTOWER1]\n[port COM1]\n");
-    Open("KIVOTOWER1");
-    shooter->Diagnose(Packed(0xE0050C52u), &view);
-    EXPECT_EQ(view.shown, std::vector<int>{1102});
-    EXPECT_EQ(Body().find("Find USB Tower"), std::string::npos);
-    session().Destroy(handle);
-}
-
-TEST_F(SimulatedDiagnosis, NoMoreItemsOnASerialTower)
-{
-    Start("[brick onyx2]\n[port KIVOTOWER1]\n[port COM1]\n");
-    Open("COM1");
-    shooter->Diagnose(Packed(0xE0050C52u), &view);
-    EXPECT_EQ(view.shown, std::vector<int>{1002});
-    session().Destroy(handle);
-}
-
-TEST_F(SimulatedDiagnosis, OpalFacilityJumpsNowhere)
-{
-    Start("[brick onyx2]\n[port COM1]\n");
-    Open("COM1");
-    EXPECT_FALSE(shooter->Diagnose(Packed(0xE0030010u), &view));
-    EXPECT_TRUE(view.shown.empty());
-    const std::string body = Body();
-    const std::string tail =
-        "\tJump facility failed:\n\t\tError (0xe0030010) from Opal: undefined label\n";
-    ASSERT_GE(body.size(), tail.size());
-    EXPECT_EQ(body.substr(body.size() - tail.size()), tail);
-    session().Destroy(handle);
-}
-
-TEST_F(SimulatedDiagnosis, DriverCode118ShowsOutcome1103)
-{
-    Start("[brick onyx2]\n[port KIVOTOWER1]\n");
-    Open("KIVOTOWER1");
-    shooter->Diagnose(Packed(0xE0050476u), &view);
-    EXPECT_EQ(view.shown, std::vector<int>{1103});
-    EXPECT_NE(
-        Body().find("\tDiagnosing Error failed:\n\t\tError (0xe0050476) from Tessel driver: "),
-        std::string::npos);
-    session().Destroy(handle);
-}
-
-TEST_F(SimulatedDiagnosis, RepairWithPortTypeZeroCallsNothing)
-{
-    ForbiddingCalls forbidding;
-    tessel::Long slot = 9;
-    TroubleShooter quiet(&forbidding, &slot, nullptr, &system);
-    EXPECT_FALSE(quiet.RepairUsbTower(0));
-    quiet.CloseLog();
-    EXPECT_EQ(slot, 9);
+    for (const Case& c : cases) {
+        SCOPED_TRACE(std::string(c.port) + " " + std::to_string(c.error));
+        Open(c.port);
+        view.shown.clear();
+        EXPECT_EQ(shooter->Diagnose(Packed(c.error), &view), !c.shown.empty());
+        EXPECT_EQ(view.shown, c.shown);
+        EXPECT_EQ(Body().find("Find USB Tower"), std::string::npos) << "the tower answers";
+        if (c.logged != nullptr) {
+            EXPECT_NE(Body().find(c.logged), std::string::npos) << Body();
+        }
+        session().Destroy(handle);
+    }
 }
 
 TEST_F(SimulatedDiagnosis, RepairFindsTheUnpluggedTowerWithoutLog)

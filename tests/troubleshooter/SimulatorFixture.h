@@ -1,6 +1,6 @@
-// The brick session against the simulated library, for driving the Trouble Shooter through
-// scenarios. Each test writes its scenario and a settings file into a directory of its own;
-// the session then loads Tessel.dll by absolute path from the folder it was built into.
+// The brick session against the simulated library. Each test writes its scenario and a
+// settings file into a directory of its own; the session then loads Tessel.dll by absolute
+// path from the folder it was built into. No workspace object may outlive a test.
 #pragma once
 
 #include <gtest/gtest.h>
@@ -43,7 +43,7 @@ protected:
     {
         ::setenv("TESSEL_SIM", WriteFile("scenario.txt", "link-time = 0\n" + scenario).c_str(), 1);
         WriteFile("harbor.ini", SettingsText());
-        session_ = std::make_unique<BrickSession>(SettingsPath().c_str());
+        session_ = std::make_unique<BrickSession>((dir_ / "harbor.ini").string().c_str());
         ASSERT_TRUE(session_->libraryLoaded()) << "Tessel.dll not found in " HARBOR_SIM_DIR;
     }
 
@@ -51,20 +51,17 @@ protected:
     {
         return "[PATHS]\nDLL=" + std::string(HARBOR_SIM_DIR) + "/\n[DEBUG]\nMEMFILES=TRUE\n";
     }
-    std::string SettingsPath() const { return (dir_ / "harbor.ini").string(); }
     std::string LogPath() const { return (dir_ / "shooter.log").string(); }
-    std::string Log() const { return ReadFile(LogPath()); }
-
+    std::string Log() const
+    {
+        std::ifstream in(LogPath(), std::ios::binary);
+        return std::string(std::istreambuf_iterator<char>(in), std::istreambuf_iterator<char>());
+    }
     std::string WriteFile(const std::string& name, const std::string& bytes)
     {
         const std::string path = (dir_ / name).string();
         std::ofstream(path, std::ios::binary) << bytes;
         return path;
-    }
-    static std::string ReadFile(const std::string& path)
-    {
-        std::ifstream in(path, std::ios::binary);
-        return std::string(std::istreambuf_iterator<char>(in), std::istreambuf_iterator<char>());
     }
 
     BrickSession& session() { return *session_; }
