@@ -163,7 +163,7 @@ std::string DesktopRegistration::mimePackagePath() const
 
 std::string DesktopRegistration::UserDataHome()
 {
-    // The base directory specification: a relative XDG_DATA_HOME is invalid and ignored.
+    // A relative XDG_DATA_HOME is invalid and ignored, as the XDG base directories have it.
     const char* dataHome = std::getenv("XDG_DATA_HOME");
     if (dataHome != nullptr && dataHome[0] == '/')
         return dataHome;

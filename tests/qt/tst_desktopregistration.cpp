@@ -71,8 +71,6 @@ private slots:
     void registerWritesEntryAndMimeType();
     void execLine_data();
     void execLine();
-    void pathThatCannotBeWritten_data();
-    void pathThatCannotBeWritten();
     void unregisterRemovesBoth();
     void registerFailsWhereNothingCanBeWritten();
     void userDataHome_data();
@@ -145,26 +143,6 @@ void tst_DesktopRegistration::execLine()
     const QString entry =
         QString::fromStdString(DesktopRegistration::DesktopEntry(program.toStdString()));
     QCOMPARE(LineStarting(entry, "Exec="), exec);
-}
-
-void tst_DesktopRegistration::pathThatCannotBeWritten_data()
-{
-    QTest::addColumn<QString>("program");
-    QTest::newRow("relative") << "bin/harbor";
-    QTest::newRow("empty") << "";
-    QTest::newRow("line break") << "/opt/a\nb/harbor";
-}
-
-void tst_DesktopRegistration::pathThatCannotBeWritten()
-{
-    QFETCH(QString, program);
-    QTemporaryDir data;
-    QVERIFY(DesktopRegistration::DesktopEntry(program.toStdString()).empty());
-    const DesktopRegistration registration(data.path().toStdString(), program.toStdString());
-    std::string report;
-    QCOMPARE(registration.Register(report), 1);
-    QVERIFY(report.rfind("RegServer failed", 0) == 0);
-    QVERIFY(!QFileInfo::exists(data.filePath("applications/harbor.desktop")));
 }
 
 void tst_DesktopRegistration::unregisterRemovesBoth()

@@ -28,17 +28,14 @@ private slots:
     void captionAndSize();
     void control_data();
     void control();
-    void labelsAndFrames();
     void controlsDoNotOverlap();
     void editorAndStatusBox();
     void menu_data();
     void menu();
-    void menuBarTitles();
     void greyedItemIsWired();
     void buttonSendsItsCommand_data();
     void buttonSendsItsCommand();
     void checkBoxTogglesThenSends();
-    void radioButtonsFormOneGroup();
     void escapeAndCloseBoxSendCancel();
 
 private:
@@ -141,35 +138,6 @@ void tst_DialogWindow::control()
         QVERIFY(!box->isChecked());
 }
 
-void tst_DialogWindow::labelsAndFrames()
-{
-    DialogWindow window(ui::TestClientDialogTemplate());
-    QStringList labels;
-    for (QLabel* label : window.findChildren<QLabel*>())
-        labels << label->text();
-    QVERIFY(labels.contains(QStringLiteral("Brick:")));
-    QVERIFY(labels.contains(QStringLiteral("Source:")));
-    QStringList frames;
-    for (QGroupBox* frame : window.findChildren<QGroupBox*>())
-        frames << frame->title();
-    frames.sort();
-    QCOMPARE(frames, QStringList({"Download", "Range"}));
-
-    // The Download frame holds the two check boxes and the Range frame the three radio
-    // buttons: each lies inside its frame.
-    auto frameOf = [&window](const QString& title) {
-        for (QGroupBox* frame : window.findChildren<QGroupBox*>()) {
-            if (frame->title() == title)
-                return frame->geometry();
-        }
-        return QRect();
-    };
-    for (int id : {210, 223})
-        QVERIFY(frameOf("Download").contains(window.control(id)->geometry()));
-    for (int id : {218, 219, 220})
-        QVERIFY(frameOf("Range").contains(window.control(id)->geometry()));
-}
-
 void tst_DialogWindow::controlsDoNotOverlap()
 {
     DialogWindow window(ui::TestClientDialogTemplate());
@@ -255,18 +223,6 @@ void tst_DialogWindow::menu()
     }
 }
 
-void tst_DialogWindow::menuBarTitles()
-{
-    DialogWindow window(ui::TestClientDialogTemplate());
-    QStringList titles;
-    for (QAction* top : window.menuBar()->actions())
-        titles << QString(top->text()).remove(QLatin1Char('&'));
-    QCOMPARE(titles, QStringList({"File", "Port", "Script", "Special", "Help"}));
-    // Menu ids without a button of their own are reachable through the menu only.
-    for (int id : {32768, 32769, 32770, 32771, 32773, 32774, 32775, 32777})
-        QVERIFY(window.menuAction(id) != nullptr);
-}
-
 void tst_DialogWindow::greyedItemIsWired()
 {
     DialogWindow window(ui::TestClientDialogTemplate());
@@ -319,21 +275,6 @@ void tst_DialogWindow::checkBoxTogglesThenSends()
     QTest::mouseClick(autoRun, Qt::LeftButton, {}, QPoint(4, autoRun->height() / 2));
     QVERIFY(autoRun->isChecked());
     QVERIFY(checkedWhenSent);
-}
-
-void tst_DialogWindow::radioButtonsFormOneGroup()
-{
-    DialogWindow window(ui::TestClientDialogTemplate());
-    window.show();
-    for (int id : {218, 219, 220})
-        window.control(id)->setEnabled(true);
-    QSignalSpy commands(&window, &DialogWindow::commandIssued);
-    qobject_cast<QRadioButton*>(window.control(218))->click();
-    qobject_cast<QRadioButton*>(window.control(220))->click();
-    QVERIFY(!qobject_cast<QRadioButton*>(window.control(218))->isChecked());
-    QVERIFY(qobject_cast<QRadioButton*>(window.control(220))->isChecked());
-    QCOMPARE(commands.count(), 2);
-    QCOMPARE(commands.at(1).at(0).toInt(), 220);
 }
 
 void tst_DialogWindow::escapeAndCloseBoxSendCancel()

@@ -1,6 +1,6 @@
 // The window program's start: the application and host that CreateGuiHost makes, seen from
-// outside through harbor itself. Without a reachable display harbor says so in one line,
-// names the headless mode, and ends without a crash.
+// outside through harbor itself. It shows its window and ends cleanly; without a reachable
+// display it says so in one line, names the headless mode, and ends without a crash.
 #include <QProcess>
 #include <QTest>
 
@@ -9,8 +9,25 @@ class tst_GuiHost : public QObject {
 
 private slots:
     void withoutDisplay_data();
+    void windowShownThenExit();
     void withoutDisplay();
 };
+
+// The whole window program: settings, session, the window shown, then its own Exit through
+// the message loop (the start-up benchmark's hook) and the teardown.
+void tst_GuiHost::windowShownThenExit()
+{
+    QProcessEnvironment environment = QProcessEnvironment::systemEnvironment();
+    environment.insert(QStringLiteral("QT_QPA_PLATFORM"), QStringLiteral("offscreen"));
+    environment.insert(QStringLiteral("HARBOR_EXIT_WHEN_SHOWN"), QStringLiteral("1"));
+    QProcess harbor;
+    harbor.setProcessEnvironment(environment);
+    harbor.start(QStringLiteral(HARBOR_PROGRAM), {});
+    QVERIFY(harbor.waitForFinished(60000));
+    QCOMPARE(harbor.exitStatus(), QProcess::NormalExit);
+    QCOMPARE(harbor.exitCode(), 0);
+    QCOMPARE(harbor.readAllStandardOutput(), QByteArray("shown\n"));
+}
 
 void tst_GuiHost::withoutDisplay_data()
 {

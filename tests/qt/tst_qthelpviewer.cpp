@@ -74,7 +74,6 @@ private slots:
     void commandLinkGoesToTheOwner();
     void topicLinkStaysInTheViewer();
     void closingTheWindowSendsCloseOnce();
-    void quitSendsNothing();
     void troubleShooterRunFollowsLinks();
     void exitDuringARunWaitsForTheRunToEnd_data();
     void exitDuringARunWaitsForTheRunToEnd();
@@ -215,22 +214,6 @@ void tst_QtHelpViewer::closingTheWindowSendsCloseOnce()
     QCOMPARE(link.count(ui::kMsgCommand), 1);
     QCOMPARE(viewer.Quit(owner, "shooter.hlp"), 1);
     QVERIFY(!viewer.IsOpen());
-    host.DestroyWindow(owner);
-}
-
-void tst_QtHelpViewer::quitSendsNothing()
-{
-    ui::QtHost host(kHelpDirectory);
-    RecordingObject link;
-    const ui::WindowHandle owner = host.CreatePlainWindow("trbl_wnd", &link);
-    QtHelpViewer& viewer = host.helpViewer();
-    QCOMPARE(viewer.OpenFile(owner, "shooter.hlp"), 1);
-    QCOMPARE(viewer.RunMacro(owner, "shooter.hlp", R"(JI("shooter.hlp","Onyx_ok"))"), 1);
-    QCOMPARE(viewer.Quit(owner, "shooter.hlp"), 1);
-    QVERIFY(!viewer.window()->isVisible());
-    QVERIFY(!viewer.IsOpen());
-    QTest::qWait(0);
-    QCOMPARE(link.count(ui::kMsgCommand), 0);
     host.DestroyWindow(owner);
 }
 

@@ -46,19 +46,15 @@ private slots:
 
     void initialWindow_data();
     void initialWindow();
-    void startupFileLoadsIntoTheEditor();
     void clickChangesStatus_data();
     void clickChangesStatus();
     void openAsksWhichPortWithoutOwner();
-    void rangeButtonsNeedAnOpenUsbPort();
-    void downloadReportsProgressFromTheLibrarysThread();
     void longDownloadKeepsTheWindowResponsive();
     void messagePostedFromAnotherThreadReachesStatus();
     void fileOpenAndSaveThroughTheAnswerer();
-    void saveWithoutFileAsksForAName();
     void failureOffersTroubleShooterOwnedByTheDialog();
-    void exitFromTheMenuEndsTheLoop();
-    void closeBoxExits();
+    void exitEndsTheLoop_data();
+    void exitEndsTheLoop();
 
 private:
     void start(const std::string& scenario, const std::string& ports,
@@ -145,7 +141,6 @@ void tst_TestClientDialog::initialWindow_data()
     QTest::newRow("defaults") << "" << false << false;
     QTest::newRow("auto clear") << "AUTOCLEAR=TRUE" << true << false;
     QTest::newRow("auto run") << "AUTORUN=true" << false << true;
-    QTest::newRow("both") << "AUTOCLEAR=TRUE\nAUTORUN=TRUE" << true << true;
 }
 
 void tst_TestClientDialog::initialWindow()
@@ -183,18 +178,6 @@ void tst_TestClientDialog::initialWindow()
         QVERIFY(!window()->control(id)->isEnabled());
     // The host hands its help viewer to the dialog it shows.
     QCOMPARE(static_cast<HelpViewer*>(&host_->helpViewer()), dialog_->helpViewer());
-}
-
-void tst_TestClientDialog::startupFileLoadsIntoTheEditor()
-{
-    SimFolder scripts(qt_test::kFastLink, "");
-    const QString path =
-        scripts.writeFile(QStringLiteral("blink.onyx2"), "task main\r\n{\r\n}\r\n");
-    start(qt_test::kFastLink, "", "", path.toStdString());
-    QCOMPARE(window()->windowTitle(), QStringLiteral("Tessel Test Client - blink.onyx2"));
-    auto* editor = qobject_cast<QPlainTextEdit*>(window()->control(ui::IdEditor));
-    QCOMPARE(editor->toPlainText(), QStringLiteral("task main\n{\n}\n"));
-    QCOMPARE(QString::fromLocal8Bit(dialog_->currentFile()), path);
 }
 
 void tst_TestClientDialog::clickChangesStatus_data()
@@ -264,43 +247,6 @@ void tst_TestClientDialog::openAsksWhichPortWithoutOwner()
     QCOMPARE(answerer_.questions[0].text, kUsbPort);
 }
 
-void tst_TestClientDialog::rangeButtonsNeedAnOpenUsbPort()
-{
-    start(qt_test::ShippedTestScenario(), kUsbPortSetting);
-    // At start-up the configured name is opened as a device path.
-    QCOMPARE(status(), QStringLiteral("Opened \\\\.\\KIVOTOWER1, Onyx2 brick"));
-    for (int id : {ui::IdRangeShort, ui::IdRangeMedium, ui::IdRangeLong})
-        QVERIFY(window()->control(id)->isEnabled());
-    // The tower's range is shown checked.
-    QVERIFY(qobject_cast<QRadioButton*>(window()->control(ui::IdRangeLong))->isChecked() ||
-            qobject_cast<QRadioButton*>(window()->control(ui::IdRangeShort))->isChecked() ||
-            qobject_cast<QRadioButton*>(window()->control(ui::IdRangeMedium))->isChecked());
-    click(ui::IdRangeShort);
-    QCOMPARE(status(), QStringLiteral("Short range"));
-    QVERIFY(!qobject_cast<QRadioButton*>(window()->control(ui::IdRangeLong))->isChecked());
-}
-
-void tst_TestClientDialog::downloadReportsProgressFromTheLibrarysThread()
-{
-    start(qt_test::ShippedTestScenario(), kUsbPortSetting);
-    auto* box = qobject_cast<QPlainTextEdit*>(window()->control(ui::IdStatusBox));
-    QStringList seen;
-    connect(box, &QPlainTextEdit::textChanged, this, [&] { seen << box->toPlainText(); });
-    setEditor(QString::fromStdString(qt_test::SoundProgram(40)));
-    selectSource(ui::SourceListBin);
-    click(ui::IdDownload);
-    QTRY_VERIFY_WITH_TIMEOUT(status().startsWith(QStringLiteral("Downloaded ok")), kReportMs);
-    // "Downloading", then the reports the library's thread posted, the last one final.
-    QVERIFY(seen.contains(QStringLiteral("Downloading")));
-    QVERIFY(seen.indexOf(QStringLiteral("Downloading")) < seen.size() - 1);
-    for (const QString& text : seen) {
-        QVERIFY2(text.isEmpty() || text == QLatin1String("Downloading") ||
-                     text.startsWith(QLatin1String("Downloading: ")) ||
-                     text.startsWith(QLatin1String("Downloaded ok")),
-                 qPrintable(text));
-    }
-}
-
 void tst_TestClientDialog::longDownloadKeepsTheWindowResponsive()
 {
     // 20 milliseconds a command: 150 commands take three seconds.
@@ -315,7 +261,12 @@ void tst_TestClientDialog::longDownloadKeepsTheWindowResponsive()
     // The button's command returned with the download under way, not done.
     QVERIFY2(!status().startsWith(QStringLiteral("Downloaded ok")), qPrintable(status()));
     const int ticksAtClick = ticks;
+    auto* box = qobject_cast<QPlainTextEdit*>(window()->control(ui::IdStatusBox));
+    QStringList seen;
+    connect(box, &QPlainTextEdit::textChanged, this, [&] { seen << box->toPlainText(); });
     QTRY_VERIFY_WITH_TIMEOUT(status().startsWith(QStringLiteral("Downloaded ok")), kReportMs);
+    // The library's thread reported progress on the way.
+    QVERIFY2(seen.first().startsWith(QLatin1String("Downloading: ")), qPrintable(seen.join('|')));
     // The loop kept running meanwhile: timers fired, and so would paint and input events.
     QVERIFY(ticks > ticksAtClick);
 }
@@ -368,24 +319,6 @@ void tst_TestClientDialog::fileOpenAndSaveThroughTheAnswerer()
              QString());
 }
 
-void tst_TestClientDialog::saveWithoutFileAsksForAName()
-{
-    start(qt_test::kFastLink, "");
-    setEditor(QStringLiteral("task main\n{\n}\n"));
-    const QString target = folder_->filePath(QStringLiteral("new.onyx2"));
-    answerer_.QueueFile(target);
-    trigger(ui::IdFileSave);
-    QCOMPARE(answerer_.fileDialogs.size(), std::size_t(1));
-    QCOMPARE(answerer_.fileDialogs[0].kind, ui::Answerer::FileDialogKind::Save);
-    QCOMPARE(answerer_.fileDialogs[0].initialName, QStringLiteral("*.onyx2"));
-    QCOMPARE(qt_test::ReadAll(target), QByteArray("task main\n{\n}\n"));
-    // Now there is a file: Save writes it without asking.
-    setEditor(QStringLiteral("task main\n{\n  sound 2\n}\n"));
-    trigger(ui::IdFileSave);
-    QCOMPARE(answerer_.fileDialogs.size(), std::size_t(1));
-    QCOMPARE(qt_test::ReadAll(target), QByteArray("task main\n{\n  sound 2\n}\n"));
-}
-
 void tst_TestClientDialog::failureOffersTroubleShooterOwnedByTheDialog()
 {
     // No tower anywhere: Open finds nothing, shows why, and offers the Trouble Shooter.
@@ -402,23 +335,28 @@ void tst_TestClientDialog::failureOffersTroubleShooterOwnedByTheDialog()
     QVERIFY(!host_->helpViewer().IsOpen());
 }
 
-void tst_TestClientDialog::exitFromTheMenuEndsTheLoop()
+void tst_TestClientDialog::exitEndsTheLoop_data()
 {
+    QTest::addColumn<bool>("closeBox");
+    QTest::newRow("File Exit") << false;
+    QTest::newRow("close box") << true;
+}
+
+void tst_TestClientDialog::exitEndsTheLoop()
+{
+    QFETCH(bool, closeBox);
     start(qt_test::ShippedTestScenario(), kUsbPortSetting);
-    QTimer::singleShot(0, this, [this] { trigger(ui::IdFileExit); });
+    QPointer<ui::DialogWindow> shown = window();
+    QTimer::singleShot(0, this, [this, shown, closeBox] {
+        if (closeBox)
+            shown->close();
+        else
+            trigger(ui::IdFileExit);
+    });
     QCOMPARE(host_->RunMessageLoop(), 0);
     // The window and the session are gone with the port.
     QCOMPARE(dialog_->handle(), ui::kNoWindow);
     QVERIFY(dialog_->session() == nullptr);
-}
-
-void tst_TestClientDialog::closeBoxExits()
-{
-    start(qt_test::kFastLink, "");
-    QPointer<ui::DialogWindow> shown = window();
-    QTimer::singleShot(0, this, [shown] { shown->close(); });
-    QCOMPARE(host_->RunMessageLoop(), 0);
-    QCOMPARE(dialog_->handle(), ui::kNoWindow);
     QVERIFY(shown.isNull() || !shown->isVisible());
 }
 
