@@ -68,12 +68,4 @@ TEST_F(HeadlessTroubleShooter, HelpLinksRunTestsAndTheLogKeepsThem)
     EXPECT_NE(log.find("\nTrouble Shooter closed\n"), std::string::npos) << log;
 }
 
-TEST_F(HeadlessTroubleShooter, NoToTheOfferWritesNoLog)
-{
-    Run(kNoTower, "Answer no\nOpen\n");
-    Find("Use Trouble Shooter?");
-    EXPECT_EQ(out.str().find("[help]"), std::string::npos) << out.str();
-    EXPECT_FALSE(std::filesystem::exists(LogPath()));
-}
-
 } // namespace

@@ -250,20 +250,6 @@ TEST_F(MemoryFile, HandlesAndClonesShareTheBytesWithOwnPositions)
     EXPECT_EQ(textClone->release(), nullptr);
 }
 
-TEST_F(MemoryFile, HandleHoldsTheEntryAndTheBlock)
-{
-    const std::int64_t before = live();
-    auto* block = new MemoryBlock();
-    auto* entry = new MemoryEntry(block);
-    ReaderWriter* handle = entry->open(0);
-    EXPECT_EQ(entry->refCount(), 1);
-    EXPECT_EQ(block->refCount(), 2);
-    EXPECT_EQ(live(), before + 3);
-    // The handle's reference is the entry's last: both go with it, block included.
-    EXPECT_EQ(handle->release(), nullptr);
-    EXPECT_EQ(live(), before);
-}
-
 // ---- text ----
 
 TEST_F(MemoryFile, TextStoresLfAsCrLfAndReadsItBack)
