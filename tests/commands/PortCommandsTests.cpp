@@ -1,4 +1,5 @@
 // Open, Close, Test, Statistics and the range buttons against the simulated library.
+#include <ostream>
 #include <string>
 
 #include "DialogFixture.h"
@@ -179,6 +180,21 @@ struct BrickName {
     const char* shown;
 };
 
+void PrintTo(const BrickName& name, std::ostream* out)
+{
+    *out << name.scenarioType;
+}
+
+std::string TestName(const ::testing::TestParamInfo<BrickName>& info)
+{
+    std::string name = info.param.scenarioType;
+    for (char& c : name) {
+        if (c == '-')
+            c = '_';
+    }
+    return name;
+}
+
 class BrickNames : public PortCommands, public ::testing::WithParamInterface<BrickName> {};
 
 TEST_P(BrickNames, TheDetectedTypeIsNamedFromTheTable)
@@ -197,7 +213,8 @@ INSTANTIATE_TEST_SUITE_P(PortCommands, BrickNames,
                                            BrickName{"helmsman", "Helmsman brick"},
                                            BrickName{"onyx-no-firmware", "Onyx brick, no firmware"},
                                            BrickName{"onyx", "Onyx brick"},
-                                           BrickName{"minirover", "MiniRover brick"}));
+                                           BrickName{"minirover", "MiniRover brick"}),
+                         TestName);
 
 TEST_F(PortCommands, ATowerRefusingStatisticsStopsTheOpenedSteps)
 {
