@@ -78,6 +78,7 @@ TEST_F(DirectoryTree, FindResolvesDotsSlashesAndTheTop)
         EXPECT_EQ(top_->find(path), nullptr) << path;
     }
     EXPECT_EQ(top_->find(nullptr), nullptr);
+    EXPECT_EQ(temp->find(".."), script);
     EXPECT_EQ(temp->find("/"), top_);
     EXPECT_EQ(temp->find("../.."), top_);
     EXPECT_EQ(temp->find("../../.."), nullptr);
@@ -152,6 +153,10 @@ TEST_F(DirectoryTree, LongPathsAndDeepTreesAreSafe)
     EXPECT_EQ(top_->find((wandering + "a/f").c_str()), file);
     EXPECT_FALSE(top_->remove((wandering + "missing").c_str()));
     EXPECT_EQ(top_->find(std::string(300000, '/').c_str()), top_);
+    const std::string longName(100000, 'n');
+    DirEnt* named = newFile();
+    EXPECT_EQ(top_->insert(longName.c_str(), named), named);
+    EXPECT_EQ(top_->find((longName + "n").c_str()), nullptr);
 
     for (int i = 0; i < 5000; ++i) {
         deep += "d/";
