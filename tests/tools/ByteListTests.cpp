@@ -1,6 +1,5 @@
 #include <gtest/gtest.h>
 
-#include <cstring>
 #include <string>
 
 #include "tessel/ReaderWriter.h"
@@ -11,94 +10,38 @@
 
 namespace {
 
-class TextFile {
-public:
-    explicit TextFile(const std::string& text) : file_(tools::NewScratchFile(0))
-    {
-        file_->openWrite();
-        file_->write(text.data(), static_cast<std::int32_t>(text.size()));
-        file_->close();
-    }
-    ~TextFile() { tools::ReleaseHandle(&file_); }
-    ReaderWriter* get() { return file_; }
-
-private:
-    ReaderWriter* file_;
-};
-
-class ByteList : public ::testing::Test {
-protected:
-    void TearDown() override { EXPECT_EQ(workspace::LiveObjectCount(), before_); }
-    std::int64_t before_ = workspace::LiveObjectCount();
-};
+ReaderWriter* FileOf(const std::string& text)
+{
+    ReaderWriter* file = tools::NewScratchFile(0);
+    file->openWrite();
+    file->write(text.data(), static_cast<std::int32_t>(text.size()));
+    file->close();
+    return file;
+}
 
 } // namespace
 
-TEST_F(ByteList, ParsesFiveCharacterValues)
+TEST(ByteList, ParseKeepsValuesOfAnyWidthInStep)
 {
-    TextFile file("0x00,0x03,0x0a,0xff");
+    const std::int64_t before = workspace::LiveObjectCount();
+    ReaderWriter* file = FileOf("0x00,0xff,0x1,0x123,zz,0x0a\r\n");
     unsigned char out[8] = {};
-    EXPECT_EQ(tools::ParseByteList(file.get(), out, 8), 4);
-    EXPECT_EQ(out[0], 0);
-    EXPECT_EQ(out[1], 3);
-    EXPECT_EQ(out[2], 10);
-    EXPECT_EQ(out[3], 255);
+    ASSERT_EQ(tools::ParseByteList(file, out, 8), 5);
+    EXPECT_EQ(std::string(reinterpret_cast<char*>(out), 5), std::string("\x00\xff\x01\x23\x0a", 5));
+    EXPECT_EQ(tools::ParseByteList(file, out, 2), 2);
+    EXPECT_EQ(tools::ParseByteList(nullptr, out, 2), 0);
+    tools::ReleaseHandle(&file);
+    EXPECT_EQ(workspace::LiveObjectCount(), before);
 }
 
-TEST_F(ByteList, StopsAtTheWantedCount)
+TEST(ByteList, ReadByteValueReadsAFieldOfAnyLengthAndZeroAtTheEnd)
 {
-    TextFile file("0x01,0x02,0x03");
-    unsigned char out[3] = {0, 0, 0x55};
-    EXPECT_EQ(tools::ParseByteList(file.get(), out, 2), 2);
-    EXPECT_EQ(out[2], 0x55);
-}
-
-TEST_F(ByteList, ValuesOfOtherWidthsStayInStep)
-{
-    TextFile file("0x1,0x123,0x02\r\n");
-    unsigned char out[4] = {};
-    ASSERT_EQ(tools::ParseByteList(file.get(), out, 4), 3);
-    EXPECT_EQ(out[0], 0x01);
-    EXPECT_EQ(out[1], 0x23); // low 8 bits
-    EXPECT_EQ(out[2], 0x02);
-}
-
-TEST_F(ByteList, FieldThatDoesNotParseStoresNothing)
-{
-    TextFile file("0x01,zz,0x02");
-    unsigned char out[4] = {};
-    ASSERT_EQ(tools::ParseByteList(file.get(), out, 4), 2);
-    EXPECT_EQ(out[1], 0x02);
-}
-
-TEST_F(ByteList, NullOrEmptyFileGivesNothing)
-{
-    unsigned char out[4] = {};
-    EXPECT_EQ(tools::ParseByteList(nullptr, out, 4), 0);
-    TextFile empty("");
-    EXPECT_EQ(tools::ParseByteList(empty.get(), out, 4), 0);
-}
-
-TEST_F(ByteList, ReadByteValueReadsAFieldOfAnyLength)
-{
-    std::string longField = "0x" + std::string(5000, '0') + "41";
-    TextFile file(longField + ",0x7,garbage,");
-    file.get()->openRead();
-    EXPECT_EQ(tools::ReadByteValue(file.get()), 0x41);
-    EXPECT_EQ(tools::ReadByteValue(file.get()), 0x07);
-    EXPECT_EQ(tools::ReadByteValue(file.get()), 0);
-    // At the end of the file a value reads as 0.
-    EXPECT_EQ(tools::ReadByteValue(file.get()), 0);
-    EXPECT_EQ(tools::ReadByteValue(file.get()), 0);
-    file.get()->close();
-}
-
-TEST_F(ByteList, ReadWordTakesTheHighByteFirst)
-{
-    TextFile file("0x12,0x34,0xab");
-    file.get()->openRead();
-    EXPECT_EQ(tools::ReadWord(file.get()), 0x1234);
+    ReaderWriter* file = FileOf("0x" + std::string(5000, '0') + "41,garbage,0x12,0x34,0xab");
+    file->openRead();
+    EXPECT_EQ(tools::ReadByteValue(file), 0x41);
+    EXPECT_EQ(tools::ReadByteValue(file), 0);
+    EXPECT_EQ(tools::ReadWord(file), 0x1234);
     // The missing low byte reads as 0.
-    EXPECT_EQ(tools::ReadWord(file.get()), 0xab00);
-    file.get()->close();
+    EXPECT_EQ(tools::ReadWord(file), 0xab00);
+    tools::ReleaseHandle(&file);
 }

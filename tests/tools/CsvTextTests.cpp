@@ -2,7 +2,6 @@
 
 #include <climits>
 #include <cstdlib>
-#include <cstring>
 #include <string>
 #include <vector>
 
@@ -10,7 +9,6 @@
 
 namespace {
 
-// Cuts every line off text with NextLine, as the listing passes do.
 std::vector<std::string> AllLines(std::string text)
 {
     std::vector<char> buffer(text.begin(), text.end());
@@ -28,91 +26,37 @@ std::vector<std::string> AllLines(std::string text)
 
 } // namespace
 
-TEST(CsvNextLine, CutsAtCrLfAndMovesPastIt)
+TEST(CsvText, NextLineSplitsAtCrLfAndLoneLfAndEmptiesTheLastLineInPlace)
 {
-    char text[] = "250,main\r\n407";
+    EXPECT_EQ(AllLines("a,1\nb,2\r\n\r\nc\rd"),
+              (std::vector<std::string>{"a,1", "b,2", "", "c\rd"}));
+    char text[] = "x\r\ny";
     char* cursor = text;
     char* line = nullptr;
     EXPECT_TRUE(tools::NextLine(&cursor, &line));
-    EXPECT_STREQ(line, "250,main");
-    EXPECT_STREQ(cursor, "407");
     EXPECT_FALSE(tools::NextLine(&cursor, &line));
-    EXPECT_STREQ(line, "407");
-    // The remaining text is emptied in place.
-    EXPECT_EQ(cursor[0], 0);
-    EXPECT_EQ(text[10], 0);
+    EXPECT_STREQ(line, "y");
+    EXPECT_EQ(text[3], 0);
     std::free(line);
 }
 
-TEST(CsvNextLine, TakesLoneLineFeedsFromTextHandles)
+TEST(CsvText, TakeNumberReadsDropsAndClamps)
 {
-    EXPECT_EQ(AllLines("a,1\nb,2\r\nc"), (std::vector<std::string>{"a,1", "b,2", "c"}));
-}
-
-TEST(CsvNextLine, KeepsEmptyLinesAndStopsAtTheEnd)
-{
-    EXPECT_EQ(AllLines("\r\n\r\nx\r\n"), (std::vector<std::string>{"", "", "x"}));
-}
-
-TEST(CsvNextLine, KeepsALoneCarriageReturnInsideTheLine)
-{
-    EXPECT_EQ(AllLines("a\rb\r\n"), (std::vector<std::string>{"a\rb"}));
-}
-
-TEST(CsvTakeNumber, ReadsTheNumberAndDropsTheFirstField)
-{
-    char text[] = "231,99,1";
+    char text[] = "231,x,99999999999999999999";
     EXPECT_EQ(tools::TakeNumber(text), 231);
-    EXPECT_STREQ(text, "99,1");
-    EXPECT_EQ(tools::TakeNumber(text), 99);
-    EXPECT_EQ(tools::TakeNumber(text), 1);
-    EXPECT_STREQ(text, "");
     EXPECT_EQ(tools::TakeNumber(text), 0);
-}
-
-TEST(CsvTakeNumber, GivesZeroForAFieldThatIsNoNumber)
-{
-    char text[] = "x,7";
-    EXPECT_EQ(tools::TakeNumber(text), 0);
-    EXPECT_STREQ(text, "7");
-}
-
-TEST(CsvTakeNumber, ClampsNumbersBeyondTheIntRange)
-{
-    char big[] = "99999999999999999999,1";
-    EXPECT_EQ(tools::TakeNumber(big), INT_MAX);
-    char small[] = "-99999999999999999999";
-    EXPECT_EQ(tools::TakeNumber(small), INT_MIN);
-}
-
-TEST(CsvTakeField, EmptyTextGivesFalse)
-{
-    char text[] = "";
-    char out[8] = "keep";
-    EXPECT_FALSE(tools::TakeField(text, out, sizeof out));
-    EXPECT_STREQ(out, "keep");
-}
-
-TEST(CsvTakeField, SplitsAtTheFirstComma)
-{
-    char text[] = "main,a,b";
-    char out[8];
-    EXPECT_TRUE(tools::TakeField(text, out, sizeof out));
-    EXPECT_STREQ(out, "main");
-    EXPECT_STREQ(text, "a,b");
-    EXPECT_TRUE(tools::TakeField(text, out, sizeof out));
-    EXPECT_TRUE(tools::TakeField(text, out, sizeof out));
-    EXPECT_STREQ(out, "b");
+    EXPECT_EQ(tools::TakeNumber(text), INT_MAX);
     EXPECT_STREQ(text, "");
 }
 
-TEST(CsvTakeField, CutsALongFieldToTheBuffer)
+TEST(CsvText, TakeFieldCutsToItsBuffer)
 {
-    char text[] = "abcdefghijklmnop,rest";
-    char out[6];
-    std::memset(out, 'Z', sizeof out);
+    char text[] = "abcdefgh,rest";
+    char out[6] = "ZZZZZ";
     EXPECT_TRUE(tools::TakeField(text, out, 5));
     EXPECT_STREQ(out, "abcd");
-    EXPECT_EQ(out[5], 'Z');
+    EXPECT_EQ(out[5], 0);
     EXPECT_STREQ(text, "rest");
+    EXPECT_TRUE(tools::TakeField(text, out, sizeof out));
+    EXPECT_FALSE(tools::TakeField(text, out, sizeof out));
 }

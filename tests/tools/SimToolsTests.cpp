@@ -1,12 +1,6 @@
 // The brick tools through the dialog on the headless host, against the simulated library
 // (zero link time): Info, Upload, the memory range reads and the firmware download.
-#include <unistd.h>
-
-#include <cstdlib>
 #include <cstring>
-#include <filesystem>
-#include <fstream>
-#include <memory>
 #include <sstream>
 #include <string>
 #include <vector>
@@ -16,8 +10,6 @@
 #include "tools/BrickAccess.h"
 #include "tools/BrickQueries.h"
 #include "tools/FileText.h"
-#include "ui/headless/HeadlessHost.h"
-#include "workspace/LiveObjects.h"
 
 #ifndef HARBOR_FIRMWARE_DIR
 #define HARBOR_FIRMWARE_DIR ""
@@ -198,24 +190,6 @@ TEST_F(SimTools, RoverInfoListsTheTasksAndSubroutinesOfSlotOne)
     EXPECT_EQ(report.find("size: -"), std::string::npos) << report;
 }
 
-TEST_F(SimTools, VersionAnswerGivesItsText)
-{
-    ASSERT_NO_FATAL_FAILURE(StartOpen());
-    tools::SessionBrickAccess access(*dialog().session());
-    tools::BrickQueries queries(access);
-    tessel::Long rom = 0;
-    tessel::Long firmware = 0;
-    char text[tools::kVersionTextSize] = {};
-    EXPECT_GE(queries.GetBrickVersion(dialog().brickHandle(), &rom, &firmware, text, sizeof text),
-              0);
-    EXPECT_EQ(rom, 301);
-    EXPECT_EQ(firmware, 309);
-    EXPECT_STREQ(text, "0301.0309");
-    std::uint16_t slot = 0;
-    EXPECT_GE(queries.GetProgramSlot(dialog().brickHandle(), &slot), 0);
-    EXPECT_EQ(slot, 1);
-}
-
 TEST_F(SimTools, MemoryRangeOfThreeHundredBytesJoinsItsChunks)
 {
     ASSERT_NO_FATAL_FAILURE(StartOpen());
@@ -304,84 +278,6 @@ TEST_F(SimFirmware, WithoutAPortNothingIsSent)
     Click(ui::IdUpload);
     EXPECT_EQ(Statuses(),
               (std::vector<std::string>{"Port not open", "Port not open", "Port not open"}));
-}
-
-// The firmware path is the settings' directory and edit 222 joined as they stand. The
-// command fixture cannot set PATHS/FIRMWARE, so these tests write their own settings.
-class FirmwarePath : public ::testing::Test {
-protected:
-    void SetUp() override
-    {
-        ASSERT_NE(std::string(HARBOR_FIRMWARE_DIR), "");
-        dir_ = std::filesystem::temp_directory_path() /
-               ("harbor-firmware-path-" + std::to_string(getpid()));
-        std::filesystem::create_directories(dir_);
-    }
-
-    void TearDown() override
-    {
-        dialog_.reset();
-        host_.reset();
-        EXPECT_EQ(workspace::LiveObjectCount(), 0);
-        std::error_code ignored;
-        std::filesystem::remove_all(dir_, ignored);
-    }
-
-    void Start(const std::string& firmwareDir, const std::string& firmwareFile)
-    {
-        std::ofstream(dir_ / "scenario.txt") << kFastLink << "[brick b1]\nversion = 0301.0200\n"
-                                             << "[port COM1]\n";
-        ::setenv("TESSEL_SIM", (dir_ / "scenario.txt").c_str(), 1);
-        std::ofstream(dir_ / "harbor.ini")
-            << "[PATHS]\nDLL=" << HARBOR_SIM_DIR << "/\nFIRMWARE=" << firmwareDir << "\n"
-            << "[FIRMWARE]\nSOURCE=" << firmwareFile << "\n"
-            << "[DEBUG]\nMEMFILES=TRUE\n[PORTS]\nSerial=COM1\n";
-        host_ = std::make_unique<ui::HeadlessHost>();
-        host_->FixTickCount(500);
-        host_->SetListener([this](const ui::HeadlessEvent& event) {
-            if (event.kind == ui::HeadlessEvent::Kind::Status)
-                last_ = event.text;
-        });
-        const std::string commandLine = "\"" + (dir_ / "harbor.exe").string() + "\"";
-        dialog_ = std::make_unique<ui::TestClientDialog>(*host_, commandLine.c_str());
-        ASSERT_TRUE(dialog_->Create());
-        ASSERT_NE(dialog_->brickHandle(), 0);
-    }
-
-    void DownloadFirmware()
-    {
-        ASSERT_TRUE(host_->Click(dialog_->handle(), ui::IdNewFirmware));
-        for (;;) {
-            host_->DispatchPending();
-            if (dialog_->operationsInFlight() == 0 && host_->QueuedMessages() == 0)
-                return;
-            ASSERT_TRUE(host_->WaitForMessage(20000)) << "the download never reported back";
-        }
-    }
-
-    std::filesystem::path dir_;
-    std::unique_ptr<ui::HeadlessHost> host_;
-    std::unique_ptr<ui::TestClientDialog> dialog_;
-    std::string last_;
-};
-
-TEST_F(FirmwarePath, EmptyFileNameLeavesTheDirectorySettingAsThePath)
-{
-    ASSERT_NO_FATAL_FAILURE(Start(std::string(HARBOR_FIRMWARE_DIR) + "/Onyx2firm.kvo", ""));
-    EXPECT_EQ(host_->ControlText(dialog_->handle(), ui::IdFirmwareFileName), "");
-    ASSERT_NO_FATAL_FAILURE(DownloadFirmware());
-    EXPECT_EQ(last_, "Downloaded firmware ok (0 ms)");
-}
-
-TEST_F(FirmwarePath, DirectoryWithoutSeparatorIsJoinedUnchanged)
-{
-    // ".../resources/firm" and "ware/Onyx2firm.kvo" make the image's path only when joined
-    // with nothing in between.
-    std::string dir = HARBOR_FIRMWARE_DIR;
-    ASSERT_EQ(dir.substr(dir.size() - 4), "ware");
-    ASSERT_NO_FATAL_FAILURE(Start(dir.substr(0, dir.size() - 4), "ware/Onyx2firm.kvo"));
-    ASSERT_NO_FATAL_FAILURE(DownloadFirmware());
-    EXPECT_EQ(last_, "Downloaded firmware ok (0 ms)");
 }
 
 } // namespace
