@@ -7,83 +7,43 @@ using app::SplitCommandLine;
 
 namespace {
 
-TEST(CommandLineSplit, QuotedProgramPathAndFile)
+TEST(CommandLineSplit, SettingsBesideTheQuotedProgramAndTheFileAfterIt)
 {
-    const auto parts = SplitCommandLine("\"C:\\App\\client.exe\" C:\\work\\robot.onyx2");
-    EXPECT_EQ(parts.settingsPath, "C:\\App\\client.ini");
-    EXPECT_EQ(parts.currentFile, "C:\\work\\robot.onyx2");
-}
-
-TEST(CommandLineSplit, OnlyQuotedProgramPathGivesSettingsBesideProgram)
-{
-    const auto parts = SplitCommandLine("\"/opt/harbor/harbor.bin\"");
-    EXPECT_EQ(parts.settingsPath, "/opt/harbor/harbor.ini");
-    EXPECT_EQ(parts.currentFile, "");
-}
-
-TEST(CommandLineSplit, ProgramWithoutExtensionGetsDotIniAppended)
-{
-    EXPECT_EQ(SplitCommandLine("\"/opt/harbor/harbor\"").settingsPath, "/opt/harbor/harbor.ini");
-}
-
-TEST(CommandLineSplit, DotInDirectoryNameIsNoExtension)
-{
-    const auto parts = SplitCommandLine("\"/home/u/harbor.d/bin/harbor\" x.onyx2");
-    EXPECT_EQ(parts.settingsPath, "/home/u/harbor.d/bin/harbor.ini");
-    EXPECT_EQ(parts.currentFile, "x.onyx2");
-    EXPECT_EQ(SplitCommandLine("\"C:\\my.app\\client\"").settingsPath, "C:\\my.app\\client.ini");
-}
-
-TEST(CommandLineSplit, HiddenFileNameHasNoExtension)
-{
-    EXPECT_EQ(SplitCommandLine("\"/opt/.harbor\"").settingsPath, "/opt/.harbor.ini");
-}
-
-TEST(CommandLineSplit, UnquotedProgramPathFallsBackToDefaultName)
-{
-    const auto parts = SplitCommandLine("/opt/harbor/harbor robot.onyx2");
-    EXPECT_EQ(parts.settingsPath, "Harbor.ini");
-    EXPECT_EQ(parts.currentFile, "");
-}
-
-TEST(CommandLineSplit, ShortOrUnclosedLineFallsBack)
-{
-    EXPECT_EQ(SplitCommandLine("\"a.b\"").settingsPath, "Harbor.ini"); // 5 characters
-    EXPECT_EQ(SplitCommandLine("\"/opt/harbor/harbor x").settingsPath, "Harbor.ini");
-    EXPECT_EQ(SplitCommandLine("").settingsPath, "Harbor.ini");
+    const struct {
+        const char* line;
+        const char* settings;
+        const char* file;
+    } cases[] = {
+        {"\"C:\\App\\client.exe\" C:\\work\\robot.onyx2", "C:\\App\\client.ini",
+         "C:\\work\\robot.onyx2"},
+        {"\"/opt/harbor/harbor.bin\"", "/opt/harbor/harbor.ini", ""},
+        {"\"/opt/harbor/harbor\"", "/opt/harbor/harbor.ini", ""},
+        {"\"/home/u/harbor.d/bin/harbor\" x.onyx2", "/home/u/harbor.d/bin/harbor.ini", "x.onyx2"},
+        {"\"C:\\my.app\\client\"", "C:\\my.app\\client.ini", ""},
+        {"\"/opt/.harbor\"", "/opt/.harbor.ini", ""},
+        // Everything between the first and the last quote is taken for the program path.
+        {"\"C:\\App\\client.exe\" \"C:\\work\\robot.onyx2\"",
+         "C:\\App\\client.exe\" \"C:\\work\\robot.ini", ""},
+        {"\"/opt/har-bor/harbor\" -RegServer", "/opt/har-bor/harbor.ini", "-RegServer"},
+        {"\"/opt/harbor/harbor\" /tmp/a-b/c.onyx2", "/opt/harbor/harbor.ini", "/tmp/a-b/c.onyx2"},
+        // One separator is skipped after the closing quote, no more.
+        {"\"/opt/harbor/harbor\"  two", "/opt/harbor/harbor.ini", " two"},
+        {"\"/opt/harbor/harbor\" ", "/opt/harbor/harbor.ini", ""},
+        {"\"/opt/harbor/harbor\" a b", "/opt/harbor/harbor.ini", "a b"},
+        // Without a usable quoted program path the default name stands.
+        {"/opt/harbor/harbor robot.onyx2", "Harbor.ini", ""},
+        {"\"a.b\"", "Harbor.ini", ""},
+        {"\"/opt/harbor/harbor x", "Harbor.ini", ""},
+        {"", "Harbor.ini", ""},
+        {"\"\" robot.onyx2", "Harbor.ini", "robot.onyx2"},
+    };
+    for (const auto& c : cases) {
+        SCOPED_TRACE(c.line);
+        const auto parts = SplitCommandLine(c.line);
+        EXPECT_EQ(parts.settingsPath, c.settings);
+        EXPECT_EQ(parts.currentFile, c.file);
+    }
     EXPECT_EQ(SplitCommandLine(nullptr).settingsPath, "Harbor.ini");
-    EXPECT_EQ(SplitCommandLine("\"/opt/harbor/harbor x").currentFile, "");
-}
-
-TEST(CommandLineSplit, QuotedFileArgumentEndsTheProgramPathAtTheLastQuote)
-{
-    const auto parts = SplitCommandLine("\"C:\\App\\client.exe\" \"C:\\work\\robot.onyx2\"");
-    // Everything between the first and the last quote is taken for the program path.
-    EXPECT_EQ(parts.settingsPath, "C:\\App\\client.exe\" \"C:\\work\\robot.ini");
-    EXPECT_EQ(parts.currentFile, "");
-}
-
-TEST(CommandLineSplit, SwitchLikeArgumentsAreFileNames)
-{
-    EXPECT_EQ(SplitCommandLine("\"/opt/harbor/harbor\" -RegServer").currentFile, "-RegServer");
-    EXPECT_EQ(SplitCommandLine("\"/opt/harbor/harbor\" /tmp/a-b/c.onyx2").currentFile,
-              "/tmp/a-b/c.onyx2");
-    EXPECT_EQ(SplitCommandLine("\"/opt/har-bor/harbor\" x").settingsPath,
-              "/opt/har-bor/harbor.ini");
-}
-
-TEST(CommandLineSplit, OneSeparatorIsSkippedAfterTheClosingQuote)
-{
-    EXPECT_EQ(SplitCommandLine("\"/opt/harbor/harbor\"  two").currentFile, " two");
-    EXPECT_EQ(SplitCommandLine("\"/opt/harbor/harbor\" ").currentFile, "");
-    EXPECT_EQ(SplitCommandLine("\"/opt/harbor/harbor\" a b").currentFile, "a b");
-}
-
-TEST(CommandLineSplit, EmptyQuotedProgramPathFallsBackToDefaultName)
-{
-    const auto parts = SplitCommandLine("\"\" robot.onyx2");
-    EXPECT_EQ(parts.settingsPath, "Harbor.ini");
-    EXPECT_EQ(parts.currentFile, "robot.onyx2");
 }
 
 TEST(CommandLineCompose, QuotesExecutableAndJoinsArguments)

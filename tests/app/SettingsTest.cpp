@@ -19,14 +19,11 @@ protected:
 TEST_F(DialogSettingsReading, MissingFileGivesDefaults)
 {
     const auto settings = app::ReadDialogSettings((dir.path() + "absent.ini").c_str());
-    EXPECT_STREQ(settings.firmwareFile, "");
-    EXPECT_STREQ(settings.firmwareDir, "");
-    EXPECT_STREQ(settings.serialPort, "");
-    EXPECT_STREQ(settings.usbPort, "");
-    EXPECT_STREQ(settings.logFile, "");
-    EXPECT_FALSE(settings.autoRun);
-    EXPECT_FALSE(settings.autoClear);
-    EXPECT_FALSE(settings.autoDownload);
+    for (const char* text : {settings.firmwareFile, settings.firmwareDir, settings.serialPort,
+                             settings.usbPort, settings.logFile}) {
+        EXPECT_STREQ(text, "");
+    }
+    EXPECT_FALSE(settings.autoRun || settings.autoClear || settings.autoDownload);
 }
 
 TEST_F(DialogSettingsReading, ReadsEveryKey)
@@ -60,40 +57,41 @@ TEST_F(DialogSettingsReading, LongValuesAreCutToTheirBuffers)
 
 TEST(BooleanOption, OnlyTrueInAnyLetterCaseIsTrue)
 {
-    EXPECT_TRUE(app::IsTrueOption("true"));
-    EXPECT_TRUE(app::IsTrueOption("True"));
-    EXPECT_TRUE(app::IsTrueOption("TRUE"));
-    EXPECT_FALSE(app::IsTrueOption("1"));
-    EXPECT_FALSE(app::IsTrueOption("yes"));
-    EXPECT_FALSE(app::IsTrueOption("FALSE"));
-    EXPECT_FALSE(app::IsTrueOption("true1"));
-    EXPECT_FALSE(app::IsTrueOption("tru"));
-    EXPECT_FALSE(app::IsTrueOption(""));
+    for (const char* text : {"true", "True", "TRUE"}) {
+        EXPECT_TRUE(app::IsTrueOption(text)) << text;
+    }
+    for (const char* text : {"1", "yes", "FALSE", "true1", "tru", ""}) {
+        EXPECT_FALSE(app::IsTrueOption(text)) << text;
+    }
     EXPECT_FALSE(app::IsTrueOption(nullptr));
 }
 
-TEST(TraceOptions, ParsesLeadingDecimalNumber)
+TEST(TraceOptions, LeadingDecimalNumberKeptToItsLowSixteenBitsAsSigned)
 {
-    EXPECT_EQ(app::ParseTraceOptions("7"), 7);
-    EXPECT_EQ(app::ParseTraceOptions("  +12abc"), 12);
-    EXPECT_EQ(app::ParseTraceOptions("-3"), -3);
-    EXPECT_EQ(app::ParseTraceOptions(""), 0);
-    EXPECT_EQ(app::ParseTraceOptions("abc"), 0);
-    EXPECT_EQ(app::ParseTraceOptions("-"), 0);
-    EXPECT_EQ(app::ParseTraceOptions("0x10"), 0);
+    const struct {
+        const char* text;
+        int options;
+    } cases[] = {
+        {"7", 7},
+        {"  +12abc", 12},
+        {"-3", -3},
+        {"", 0},
+        {"abc", 0},
+        {"-", 0},
+        {"0x10", 0},
+        {"65536", 0},
+        {"65537", 1},
+        {"32768", -32768},
+        {"70000", 4464},
+        {"-32769", 32767},
+        // Far beyond any integer type: still exactly the low 16 bits (10^20 mod 2^16 = 0).
+        {"100000000000000000000", 0},
+        {"99999999999999999999", -1},
+    };
+    for (const auto& c : cases) {
+        EXPECT_EQ(app::ParseTraceOptions(c.text), c.options) << c.text;
+    }
     EXPECT_EQ(app::ParseTraceOptions(nullptr), 0);
-}
-
-TEST(TraceOptions, KeepsLowSixteenBitsAsSignedNumber)
-{
-    EXPECT_EQ(app::ParseTraceOptions("65536"), 0);
-    EXPECT_EQ(app::ParseTraceOptions("65537"), 1);
-    EXPECT_EQ(app::ParseTraceOptions("32768"), -32768);
-    EXPECT_EQ(app::ParseTraceOptions("70000"), 4464);
-    EXPECT_EQ(app::ParseTraceOptions("-32769"), 32767);
-    // Far beyond any integer type: still exactly the low 16 bits (10^20 mod 2^16 = 0).
-    EXPECT_EQ(app::ParseTraceOptions("100000000000000000000"), 0);
-    EXPECT_EQ(app::ParseTraceOptions("99999999999999999999"), -1);
 }
 
 // The trace option goes to the library through the session: the recording library shows
@@ -149,8 +147,9 @@ TEST_F(TraceOption, UnwritableTraceFileStillSwitchesTracingOn)
     EXPECT_EQ(set.numbers[2], -2);
 }
 
-TEST_F(TraceOption, ZeroOptionsWriteNothingAndCallNothing)
+TEST_F(TraceOption, ZeroOrMissingOptionsWriteNothingAndCallNothing)
 {
+    EXPECT_EQ(app::ReadTraceOptions((dir.path() + "absent.ini").c_str()), 0);
     settings = dir.write("h2.ini", "[PATHS]\nDLL=" + testsupport::RecordingLibraryDirectory() +
                                        "\n[DEBUG]\nMEMFILES=TRUE\nTRACE=\n");
     BrickSession session(settings.c_str());
@@ -159,11 +158,6 @@ TEST_F(TraceOption, ZeroOptionsWriteNothingAndCallNothing)
     app::ApplyTraceOptions(session, options, (dir.path() + "tsltrace.txt").c_str());
     EXPECT_EQ(library.state().calls[tessel::SlotSet].count, 0);
     EXPECT_FALSE(std::filesystem::exists(dir.path() + "tsltrace.txt"));
-}
-
-TEST_F(TraceOption, MissingKeyGivesZero)
-{
-    EXPECT_EQ(app::ReadTraceOptions((dir.path() + "absent.ini").c_str()), 0);
 }
 
 } // namespace
