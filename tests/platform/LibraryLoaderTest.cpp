@@ -8,7 +8,7 @@
 
 namespace {
 
-TEST(LibraryLoader, ResolvesDecoratedNamesThroughExportTable)
+TEST(LibraryLoader, ResolvesDecoratedNamesThroughTheTableAndPlainSymbolsDirectly)
 {
     platform::LibraryLoader loader;
     ASSERT_TRUE(loader.Load((testsupport::RecordingLibraryDirectory() + "Tessel.dll").c_str()))
@@ -17,39 +17,25 @@ TEST(LibraryLoader, ResolvesDecoratedNamesThroughExportTable)
         EXPECT_NE(loader.Resolve(name), nullptr) << name;
     }
     EXPECT_EQ(loader.Resolve("?tslNothing@@YAJXZ"), nullptr);
-}
-
-TEST(LibraryLoader, PlainSymbolIsFoundBeforeTheTable)
-{
-    platform::LibraryLoader loader;
-    ASSERT_TRUE(loader.Load((testsupport::RecordingLibraryDirectory() + "Tessel.dll").c_str()));
     void* address = loader.Resolve("testlib_plain_symbol");
     ASSERT_NE(address, nullptr);
     EXPECT_EQ(reinterpret_cast<int (*)()>(address)(), 42);
+
+    platform::LibraryLoader bare;
+    ASSERT_TRUE(bare.Load((testsupport::BareLibraryDirectory() + "Tessel.dll").c_str()));
+    EXPECT_EQ(bare.Resolve(tessel::kExportNames[tessel::SlotExec]), nullptr);
+    EXPECT_NE(bare.Resolve("testlib_plain_symbol"), nullptr);
 }
 
-TEST(LibraryLoader, ModuleWithoutTableResolvesOnlyPlainSymbols)
-{
-    platform::LibraryLoader loader;
-    ASSERT_TRUE(loader.Load((testsupport::BareLibraryDirectory() + "Tessel.dll").c_str()));
-    EXPECT_EQ(loader.Resolve(tessel::kExportNames[tessel::SlotExec]), nullptr);
-    EXPECT_NE(loader.Resolve("testlib_plain_symbol"), nullptr);
-}
-
-TEST(LibraryLoader, FileThatIsNotASharedObjectFailsToLoad)
+TEST(LibraryLoader, NonLibraryMissingFileAndEmptyPathFail)
 {
     testsupport::TempDirectory dir;
-    const std::string path = dir.write("Tessel.dll", "this is not a library\n");
+    const std::string junk = dir.write("Tessel.dll", "this is not a library\n");
     platform::LibraryLoader loader;
-    EXPECT_FALSE(loader.Load(path.c_str()));
+    EXPECT_FALSE(loader.Load(junk.c_str()));
     EXPECT_FALSE(loader.isLoaded());
     EXPECT_FALSE(loader.lastError().empty());
     EXPECT_EQ(loader.Resolve("anything"), nullptr);
-}
-
-TEST(LibraryLoader, MissingFileAndEmptyPathFail)
-{
-    platform::LibraryLoader loader;
     EXPECT_FALSE(loader.Load("/nonexistent/dir/Tessel.dll"));
     EXPECT_FALSE(loader.Load(""));
     EXPECT_FALSE(loader.Load(nullptr));

@@ -51,77 +51,60 @@ protected:
     std::string path;
 };
 
-TEST_F(ProfileReading, ReadsValueIgnoringLetterCaseOfNames)
+TEST_F(ProfileReading, ReadsValuesOfWellAndBadlyFormedFiles)
 {
-    path = dir.write("a.ini", "[Paths]\nDll = /opt/tessel/ \n[OPTIONS]\nAutoRun=TRUE\n");
-    EXPECT_EQ(value("PATHS", "DLL"), "/opt/tessel/");
-    EXPECT_EQ(value("paths", "dll"), "/opt/tessel/");
-    EXPECT_EQ(value("options", "AUTORUN"), "TRUE");
+    const struct {
+        const char* what;
+        std::string content;
+        const char* section;
+        const char* key;
+        const char* expected;
+    } cases[] = {
+        {"names in any case", "[Paths]\nDll = /opt/tessel/ \n", "paths", "DLL", "/opt/tessel/"},
+        {"blanks and quotes", "  [ S ]  \r\n\t k \t=\t \"quoted value \" \r\n", "S", "k",
+         "quoted value "},
+        {"single quotes", "[S]\nk='single'\n", "S", "k", "single"},
+        {"unclosed quote", "[S]\nk=\"open\r\n", "S", "k", "\"open"},
+        {"mismatched quotes", "[S]\nk=\"mixed'\n", "S", "k", "\"mixed'"},
+        {"empty quotes", "[S]\nk=\"\"\n", "S", "k", ""},
+        {"empty value is a value", "[S]\nk=\n", "S", "k", ""},
+        {"commented key", "[S]\n  ; k=also\njust text\nkey=real\n", "S", "k", "dflt"},
+        {"from the first equals", "[S]\nk = a=b ; not a comment\n", "S", "k",
+         "a=b ; not a comment"},
+        {"text after a section", "[T] trailing\nx=1\n", "T", "x", "1"},
+        {"missing section", "[S]\nk=v\n", "T", "k", "dflt"},
+        {"missing key", "[S]\nk=v\n", "S", "other", "dflt"},
+        {"empty file", "", "S", "k", "dflt"},
+        {"no sections", "k=v\nother=w\n", "S", "k", "dflt"},
+        {"first key wins", "[S]\nk=first\nk=second\n", "S", "k", "first"},
+        {"first section wins", "[S]\nk=1\n[T]\n[s]\nk=third\nonly=later\n", "S", "only", "dflt"},
+        {"byte order mark", "\xEF\xBB\xBF[S]\nk=v\n", "S", "k", "v"},
+        {"zero byte ends a line", std::string("[S]\nk=a\0b\n", 10), "S", "k", "a"},
+        {"high bytes", "[S]\nz=\xff\xfe\n", "S", "z", "\xff\xfe"},
+    };
+    for (const auto& c : cases) {
+        SCOPED_TRACE(c.what);
+        path = dir.write("a.ini", c.content);
+        EXPECT_EQ(value(c.section, c.key), c.expected);
+    }
 }
 
-TEST_F(ProfileReading, TrimsBlanksAndRemovesMatchingQuotes)
+TEST_F(ProfileReading, MissingOrUnreadableFilesGiveDefaults)
 {
-    path = dir.write("a.ini",
-                     "  [ S ]  \r\n\t k1 \t=\t \"quoted value \" \r\nk2='single'\r\nk3=\"open\r\n"
-                     "k4=\"mixed'\r\nk5=\"\"\r\n");
-    EXPECT_EQ(value("S", "k1"), "quoted value ");
-    EXPECT_EQ(value("S", "k2"), "single");
-    EXPECT_EQ(value("S", "k3"), "\"open");
-    EXPECT_EQ(value("S", "k4"), "\"mixed'");
-    EXPECT_EQ(value("S", "k5"), "");
-}
-
-TEST_F(ProfileReading, IgnoresCommentLinesAndLinesWithoutEquals)
-{
-    path = dir.write("a.ini", "[S]\n;key=commented\n  ; k2=also\njust text\nkey=real\n");
-    EXPECT_EQ(value("S", "key"), "real");
-    EXPECT_EQ(value("S", "k2"), "dflt");
-    EXPECT_EQ(keys("S"), "key|");
-}
-
-TEST_F(ProfileReading, DefaultsForMissingFileSectionAndKey)
-{
-    path = dir.path() + "absent.ini";
-    EXPECT_EQ(value("S", "k"), "dflt");
     path = dir.write("a.ini", "[S]\nk=v\n");
-    EXPECT_EQ(value("T", "k"), "dflt");
-    EXPECT_EQ(value("S", "other"), "dflt");
     EXPECT_EQ(value("S", "other", nullptr), "");
-    // An empty value is a value, not a missing key.
-    path = dir.write("b.ini", "[S]\nk=\n");
-    EXPECT_EQ(value("S", "k"), "");
-}
-
-TEST_F(ProfileReading, DirectoryInPlaceOfFileGivesDefaults)
-{
-    path = dir.path();
-    EXPECT_EQ(value("S", "k"), "dflt");
-    EXPECT_EQ(keys("S"), "");
-}
-
-TEST_F(ProfileReading, ValueRunsFromTheFirstEqualsSign)
-{
-    path = dir.write("a.ini", "[S]\nk = a=b ; not a comment\n[T] trailing\nx=1\n");
-    EXPECT_EQ(value("S", "k"), "a=b ; not a comment");
-    EXPECT_EQ(value("T", "x"), "1");
-}
-
-TEST_F(ProfileReading, EmptyFileAndFileWithoutSectionsGiveDefaults)
-{
-    path = dir.write("empty.ini", "");
-    EXPECT_EQ(value("S", "k"), "dflt");
-    EXPECT_EQ(keys("S"), "");
-    path = dir.write("nosection.ini", "k=v\nother=w\n");
-    EXPECT_EQ(value("S", "k"), "dflt");
-    EXPECT_EQ(keys("S"), "");
-}
-
-TEST_F(ProfileReading, FirstOfDuplicateSectionsAndKeysWins)
-{
-    path = dir.write("a.ini", "[S]\nk=first\nk=second\n[T]\nx=1\n[s]\nk=third\nonly=later\n");
-    EXPECT_EQ(value("S", "k"), "first");
-    EXPECT_EQ(value("S", "only"), "dflt");
-    EXPECT_EQ(keys("S"), "k|");
+    for (const std::string& unreadable : {dir.path() + "absent.ini", dir.path()}) {
+        path = unreadable;
+        EXPECT_EQ(value("S", "k"), "dflt");
+        EXPECT_EQ(keys("S"), "");
+    }
+    std::string bytes;
+    for (int i = 0; i < 4096; ++i) {
+        bytes.push_back(static_cast<char>((i * 37 + 11) & 0xFF));
+    }
+    path = dir.write("bin.ini", bytes);
+    value("S", "k");
+    keys("S", 64);
 }
 
 TEST_F(ProfileReading, CutsValueToBufferWithTerminatorIncluded)
@@ -159,37 +142,34 @@ TEST_F(ProfileReading, BinaryFileGivesDefaultsOrOddValuesWithoutHarm)
     EXPECT_EQ(keys("S"), "k|");
 }
 
-TEST_F(ProfileReading, ListsKeyNamesEachEndedByZero)
+TEST_F(ProfileReading, ListsKeyAndSectionNamesEachEndedByZero)
 {
-    path = dir.write("a.ini", "[HEADERS]\nOne=a.h\ntwo = b.h\nONE=dup.h\n[Other]\nthree=c\n");
+    path = dir.write("a.ini",
+                     "[HEADERS]\nOne=a.h\n;c=1\njust text\ntwo = b.h\nONE=dup.h\n[Other]\nthree=c\n"
+                     "[headers]\nlater=1\n");
     EXPECT_EQ(keys("headers"), "One|two|");
     EXPECT_EQ(keys("missing"), "");
+    EXPECT_EQ(keys(nullptr), "HEADERS|Other|");
+    path = dir.write("bin3.ini", std::string("[S]\n=empty\n\0x=1\nk=2\n", 20));
+    EXPECT_EQ(keys("S"), "k|");
 }
 
 TEST_F(ProfileReading, KeyListCutAtBufferStillEndsWithEmptyName)
 {
     path = dir.write("a.ini", "[S]\nalpha=1\nbeta=2\ngamma=3\n");
-    std::uint32_t returned = 0;
-    EXPECT_EQ(keys("S", 9, &returned), "alpha|b|");
-    EXPECT_EQ(returned, 7u);
-    EXPECT_EQ(keys("S", 18, &returned), "alpha|beta|gamma|");
-    EXPECT_EQ(returned, 17u);
-    EXPECT_EQ(keys("S", 17, &returned), "alpha|beta|gamm|");
-    EXPECT_EQ(returned, 15u);
-    EXPECT_EQ(keys("S", 2, &returned), "");
-    EXPECT_EQ(returned, 0u);
-}
-
-TEST_F(ProfileReading, ListsSectionNamesWithoutSection)
-{
-    path = dir.write("a.ini", "[A]\nk=1\n[B]\n[a]\n");
-    EXPECT_EQ(keys(nullptr), "A|B|");
-}
-
-TEST_F(ProfileReading, SkipsByteOrderMark)
-{
-    path = dir.write("a.ini", "\xEF\xBB\xBF[S]\nk=v\n");
-    EXPECT_EQ(value("S", "k"), "v");
+    const struct {
+        std::uint32_t size;
+        const char* list;
+        std::uint32_t returned;
+    } cases[] = {{9, "alpha|b|", 7},
+                 {18, "alpha|beta|gamma|", 17},
+                 {17, "alpha|beta|gamm|", 15},
+                 {2, "", 0}};
+    for (const auto& c : cases) {
+        std::uint32_t returned = 99;
+        EXPECT_EQ(keys("S", c.size, &returned), c.list) << c.size;
+        EXPECT_EQ(returned, c.returned) << c.size;
+    }
 }
 
 class ProfileLocation : public ::testing::Test {
