@@ -14,35 +14,28 @@ namespace {
 // The allocation that fails, counted from 1 when set; 0: none fails.
 int failCountdown = 0;
 
-bool FailThisAllocation()
+template <typename Allocate> void* AllocateUnlessFailing(Allocate allocate) noexcept
 {
-    return failCountdown > 0 && --failCountdown == 0;
+    if (failCountdown > 0 && --failCountdown == 0) {
+        return nullptr;
+    }
+    try {
+        return allocate();
+    } catch (...) {
+        return nullptr;
+    }
 }
 
 } // namespace
 
 void* operator new(std::size_t size, const std::nothrow_t&) noexcept
 {
-    if (FailThisAllocation()) {
-        return nullptr;
-    }
-    try {
-        return ::operator new(size);
-    } catch (...) {
-        return nullptr;
-    }
+    return AllocateUnlessFailing([size] { return ::operator new(size); });
 }
 
 void* operator new[](std::size_t size, const std::nothrow_t&) noexcept
 {
-    if (FailThisAllocation()) {
-        return nullptr;
-    }
-    try {
-        return ::operator new[](size);
-    } catch (...) {
-        return nullptr;
-    }
+    return AllocateUnlessFailing([size] { return ::operator new[](size); });
 }
 
 namespace {
@@ -62,10 +55,12 @@ protected:
         SessionTest::TearDown();
     }
 
+    // Disk mode names its working files in the scratch directory, never the current one.
     std::string settingsFor()
     {
         std::filesystem::create_directories(dir.path() + "tmp");
-        return writeSettings("TEMP=" + dir.path() + "tmp/\n",
+        std::filesystem::create_directories(dir.path() + "fw");
+        return writeSettings("TEMP=" + dir.path() + "tmp/\nFIRMWARE=" + dir.path() + "fw/\n",
                              std::string("[HEADERS]\na=One.h\nb=two.h\n[DEBUG]\nMEMFILES=") +
                                  (GetParam() ? "TRUE" : "FALSE") + "\n");
     }

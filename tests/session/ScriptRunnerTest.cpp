@@ -29,18 +29,18 @@ INSTANTIATE_TEST_SUITE_P(WorkingFiles, ScriptRunner, ::testing::Values(true, fal
 TEST_P(ScriptRunner, TranslateTextTranslatesIntoTheObjectFile)
 {
     BrickSession& s = openMode();
+    ASSERT_EQ(
+        s.TranslateText(6, 1, "a much longer script text", nullptr, nullptr, nullptr, nullptr), 0);
     lib().results[tessel::SlotTranslate] = 0x2005;
     ErrorSink sink;
     ReaderWriter* extra1 = s.resultEntry()->open(0);
     ReaderWriter* extra2 = s.firmwareEntry()->open(0);
     ReaderWriter* code = nullptr;
-
-    EXPECT_EQ(s.TranslateText(5, 2, "task main {}", &code, &sink, extra1, extra2), 0x2005);
+    EXPECT_EQ(s.TranslateText(5, 2, "short", &code, &sink, extra1, extra2), 0x2005);
     ASSERT_NE(code, nullptr);
     EXPECT_EQ(code->dirEnt(), s.objectEntry());
     EXPECT_EQ(code->type(), 4);
-    EXPECT_EQ(contentOf(code), "cmd task main {}");
-
+    EXPECT_EQ(contentOf(code), "cmd short");
     const RecordedCall& call = lib().calls[tessel::SlotTranslate];
     EXPECT_EQ(call.numbers[0], 5);
     EXPECT_EQ(call.pointers[2], static_cast<IError*>(&sink));
@@ -48,37 +48,10 @@ TEST_P(ScriptRunner, TranslateTextTranslatesIntoTheObjectFile)
     EXPECT_EQ(call.pointers[4], extra2);
     EXPECT_EQ(lib().sourceType, 2);
     EXPECT_EQ(lib().targetType, 4);
-    EXPECT_STREQ(lib().sourceText, "task main {}");
-
+    EXPECT_STREQ(lib().sourceText, "short"); // the shorter text replaced the longer
     for (ReaderWriter* handle : {code, extra1, extra2}) {
         BrickSession::ReleaseReaderWriter(&handle);
     }
-}
-
-TEST_P(ScriptRunner, ShorterTextReplacesTheEarlierSource)
-{
-    BrickSession& s = openMode();
-    ASSERT_GE(
-        s.TranslateText(6, 1, "a much longer script text", nullptr, nullptr, nullptr, nullptr), 0);
-    ASSERT_GE(s.TranslateText(6, 1, "short", nullptr, nullptr, nullptr, nullptr), 0);
-    EXPECT_STREQ(lib().sourceText, "short");
-}
-
-TEST_P(ScriptRunner, CodeTypeReturnsTheSourceFileWithExactlyTheText)
-{
-    BrickSession& s = openMode();
-    ReaderWriter* code = nullptr;
-    EXPECT_EQ(s.TranslateText(6, 4, "cmd 1 cmd 2", &code, nullptr, nullptr, nullptr), 0);
-    ASSERT_NE(code, nullptr);
-    EXPECT_EQ(code->dirEnt(), s.sourceEntry());
-    EXPECT_EQ(code->type(), 4);
-    EXPECT_EQ(contentOf(code), "cmd 1 cmd 2");
-    EXPECT_EQ(lib().calls[tessel::SlotTranslate].count, 0);
-    EXPECT_EQ(BrickSession::CountCommands(code), 2);
-    BrickSession::ReleaseReaderWriter(&code);
-    EXPECT_EQ(code, nullptr);
-    // Without a place to put the handle it is released, not leaked (checked at tear-down).
-    EXPECT_EQ(s.TranslateText(6, 4, "cmd", nullptr, nullptr, nullptr, nullptr), 0);
 }
 
 TEST_P(ScriptRunner, FailedTranslationReturnsTheLibraryCodeAndNoHandle)
@@ -94,84 +67,43 @@ TEST_P(ScriptRunner, FailedTranslationReturnsTheLibraryCodeAndNoHandle)
     EXPECT_EQ(sink.GetPosition(), 42);
     EXPECT_EQ(sink.GetValue(), kTranslateError);
     EXPECT_EQ(workspace::LiveObjectCount(), live);
+
+    code = reinterpret_cast<ReaderWriter*>(0x1);
+    const std::string missing = dir.path() + "missing.onyx2";
+    EXPECT_EQ(s.CompileFile(6, 1, missing.c_str(), &code, nullptr, nullptr, nullptr),
+              kTranslateError);
+    EXPECT_EQ(code, nullptr);
+    EXPECT_FALSE(std::filesystem::exists(missing));
+
+    EXPECT_EQ(s.RunImmediate(8, "sound 4", nullptr), kTranslateError);
+    EXPECT_EQ(lib().calls[tessel::SlotExec].count, 0);
 }
 
-TEST_P(ScriptRunner, TranslatedCodeIsReleasedWhenNotKept)
+// Code needs no translation: the file itself comes back, and its commands are counted.
+TEST_P(ScriptRunner, CodeTypeReturnsTheFileItselfUntranslated)
 {
     BrickSession& s = openMode();
-    const std::int64_t live = workspace::LiveObjectCount();
-    lib().results[tessel::SlotTranslate] = 3;
-    EXPECT_EQ(s.TranslateText(6, 1, "x", nullptr, nullptr, nullptr, nullptr), 3);
-    EXPECT_EQ(workspace::LiveObjectCount(), live);
-}
+    const struct {
+        const char* text;
+        std::int32_t size;
+        std::int32_t commands;
+    } cases[] = {{"", 0, 0}, {"cmd 1,2;cmd 3", 13, 2}, {"cmdcmdcm d c md", 15, 2}};
+    for (const auto& c : cases) {
+        SCOPED_TRACE(c.text);
+        ReaderWriter* code = nullptr;
+        ASSERT_EQ(s.TranslateText(6, 4, c.text, &code, nullptr, nullptr, nullptr), 0);
+        ASSERT_NE(code, nullptr);
+        EXPECT_EQ(code->dirEnt(), s.sourceEntry());
+        EXPECT_EQ(code->type(), 4);
+        EXPECT_EQ(contentOf(code), c.text);
+        EXPECT_EQ(BrickSession::ContentSize(code), c.size);
+        EXPECT_EQ(BrickSession::CountCommands(code), c.commands);
+        BrickSession::ReleaseReaderWriter(&code);
+        EXPECT_EQ(code, nullptr);
+    }
+    // Without a place to put the handle it is released, not leaked (checked at tear-down).
+    EXPECT_EQ(s.TranslateText(6, 4, "cmd", nullptr, nullptr, nullptr, nullptr), 0);
 
-TEST_P(ScriptRunner, TranslateToCsvOpensTheObjectAsListing)
-{
-    BrickSession& s = openMode();
-    ErrorSink sink;
-    ReaderWriter* listing = nullptr;
-    EXPECT_EQ(s.TranslateToCsv(4, "macro", &listing, &sink), 0);
-    ASSERT_NE(listing, nullptr);
-    EXPECT_EQ(listing->type(), 7);
-    EXPECT_EQ(lib().sourceType, 1);
-    EXPECT_EQ(lib().targetType, 7);
-    EXPECT_EQ(lib().calls[tessel::SlotTranslate].numbers[0], 4);
-    EXPECT_EQ(lib().calls[tessel::SlotTranslate].pointers[3], nullptr);
-    EXPECT_EQ(lib().calls[tessel::SlotTranslate].pointers[4], nullptr);
-    BrickSession::ReleaseReaderWriter(&listing);
-}
-
-TEST_P(ScriptRunner, CompileFileTranslatesTheHostFileInPlaceOfTheSource)
-{
-    BrickSession& s = openMode();
-    const std::string host = dir.write("Robot.onyx2", "task main { sound 1 }");
-    ErrorSink sink;
-    ReaderWriter* code = nullptr;
-    EXPECT_EQ(s.CompileFile(6, 1, host.c_str(), &code, &sink, nullptr, nullptr), 0);
-    ASSERT_NE(code, nullptr);
-    EXPECT_EQ(code->dirEnt(), s.objectEntry());
-    EXPECT_STREQ(lib().sourceText, "task main { sound 1 }");
-    EXPECT_EQ(lib().sourceType, 1);
-    DirEnt* linked = find("/Script/Temp/source.txt");
-    ASSERT_NE(linked, nullptr);
-    EXPECT_EQ(std::string(linked->fileName()), host);
-    EXPECT_EQ(dir.read("Robot.onyx2"), "task main { sound 1 }");
-    BrickSession::ReleaseReaderWriter(&code);
-}
-
-TEST_P(ScriptRunner, CompileFileThenTranslateTextThenCompileFile)
-{
-    BrickSession& s = openMode();
-    const std::string first = dir.write("first.onyx2", "first file");
-    const std::string second = dir.write("second.onyx2", "second file");
-
-    ASSERT_EQ(s.CompileFile(6, 1, first.c_str(), nullptr, nullptr, nullptr, nullptr), 0);
-    EXPECT_STREQ(lib().sourceText, "first file");
-
-    ReaderWriter* code = nullptr;
-    ASSERT_EQ(s.TranslateText(6, 1, "editor text", &code, nullptr, nullptr, nullptr), 0);
-    EXPECT_STREQ(lib().sourceText, "editor text");
-    EXPECT_EQ(contentOf(code), "cmd editor text");
-    EXPECT_EQ(find("/Script/Temp/source.txt"), s.sourceEntry());
-    // The host file was only linked, never written.
-    EXPECT_EQ(dir.read("first.onyx2"), "first file");
-    BrickSession::ReleaseReaderWriter(&code);
-
-    ASSERT_EQ(s.CompileFile(6, 1, second.c_str(), nullptr, nullptr, nullptr, nullptr), 0);
-    EXPECT_STREQ(lib().sourceText, "second file");
-    EXPECT_EQ(std::string(find("/Script/Temp/source.txt")->fileName()), second);
-
-    ReaderWriter* again = nullptr;
-    ASSERT_EQ(s.TranslateText(6, 4, "cmd direct", &again, nullptr, nullptr, nullptr), 0);
-    EXPECT_EQ(again->dirEnt(), s.sourceEntry());
-    EXPECT_EQ(contentOf(again), "cmd direct");
-    BrickSession::ReleaseReaderWriter(&again);
-    EXPECT_EQ(dir.read("second.onyx2"), "second file");
-}
-
-TEST_P(ScriptRunner, CompileFileWithCodeTypeReturnsTheHostFile)
-{
-    BrickSession& s = openMode();
     const std::string host = dir.write("prog.bin", "cmd a cmd b cmd c");
     ReaderWriter* code = nullptr;
     EXPECT_EQ(s.CompileFile(6, 4, host.c_str(), &code, nullptr, nullptr, nullptr), 0);
@@ -182,16 +114,50 @@ TEST_P(ScriptRunner, CompileFileWithCodeTypeReturnsTheHostFile)
     BrickSession::ReleaseReaderWriter(&code);
 }
 
-TEST_P(ScriptRunner, CompileFileOfMissingHostFileLeavesItToTheLibrary)
+TEST_P(ScriptRunner, TranslateToCsvOpensTheObjectAsListing)
 {
     BrickSession& s = openMode();
-    lib().results[tessel::SlotTranslate] = kTranslateError;
+    ReaderWriter* listing = nullptr;
+    EXPECT_EQ(s.TranslateToCsv(4, "macro", &listing, nullptr), 0);
+    ASSERT_NE(listing, nullptr);
+    EXPECT_EQ(listing->type(), 7);
+    EXPECT_EQ(lib().sourceType, 1);
+    EXPECT_EQ(lib().targetType, 7);
+    EXPECT_EQ(lib().calls[tessel::SlotTranslate].numbers[0], 4);
+    EXPECT_EQ(lib().calls[tessel::SlotTranslate].pointers[3], nullptr);
+    BrickSession::ReleaseReaderWriter(&listing);
+}
+
+TEST_P(ScriptRunner, CompileFileThenTranslateTextThenCompileFile)
+{
+    BrickSession& s = openMode();
+    const std::string first = dir.write("First.onyx2", "first file");
+    const std::string second = dir.write("second.onyx2", "second file");
+
     ReaderWriter* code = nullptr;
-    const std::string missing = dir.path() + "missing.onyx2";
-    EXPECT_EQ(s.CompileFile(6, 1, missing.c_str(), &code, nullptr, nullptr, nullptr),
-              kTranslateError);
-    EXPECT_EQ(code, nullptr);
-    EXPECT_FALSE(std::filesystem::exists(missing));
+    ASSERT_EQ(s.CompileFile(6, 1, first.c_str(), &code, nullptr, nullptr, nullptr), 0);
+    EXPECT_EQ(code->dirEnt(), s.objectEntry());
+    EXPECT_STREQ(lib().sourceText, "first file");
+    EXPECT_EQ(std::string(find("/Script/Temp/source.txt")->fileName()), first);
+    BrickSession::ReleaseReaderWriter(&code);
+
+    ASSERT_EQ(s.TranslateText(6, 1, "editor text", &code, nullptr, nullptr, nullptr), 0);
+    EXPECT_STREQ(lib().sourceText, "editor text");
+    EXPECT_EQ(contentOf(code), "cmd editor text");
+    EXPECT_EQ(find("/Script/Temp/source.txt"), s.sourceEntry());
+    BrickSession::ReleaseReaderWriter(&code);
+
+    ASSERT_EQ(s.CompileFile(6, 1, second.c_str(), nullptr, nullptr, nullptr, nullptr), 0);
+    EXPECT_STREQ(lib().sourceText, "second file");
+    EXPECT_EQ(std::string(find("/Script/Temp/source.txt")->fileName()), second);
+
+    ASSERT_EQ(s.TranslateText(6, 4, "cmd direct", &code, nullptr, nullptr, nullptr), 0);
+    EXPECT_EQ(code->dirEnt(), s.sourceEntry());
+    EXPECT_EQ(contentOf(code), "cmd direct");
+    BrickSession::ReleaseReaderWriter(&code);
+    // The host files were only linked, never written.
+    EXPECT_EQ(dir.read("First.onyx2"), "first file");
+    EXPECT_EQ(dir.read("second.onyx2"), "second file");
 }
 
 TEST_P(ScriptRunner, CompileFirmwareTranslatesTheImageForOnyx2)
@@ -207,7 +173,6 @@ TEST_P(ScriptRunner, CompileFirmwareTranslatesTheImageForOnyx2)
     EXPECT_EQ(call.numbers[0], 6);
     EXPECT_NE(call.pointers[2], nullptr);
     EXPECT_EQ(call.pointers[3], nullptr);
-    EXPECT_EQ(call.pointers[4], nullptr);
     EXPECT_EQ(lib().sourceType, 5);
     EXPECT_EQ(lib().targetType, 4);
     EXPECT_STREQ(lib().sourceText, "S0 firmware image");
@@ -222,7 +187,7 @@ TEST_P(ScriptRunner, CompileFirmwareTranslatesTheImageForOnyx2)
     EXPECT_EQ(std::string(find("/Script/Firmware/Onyx2firm.kvo")->fileName()), other);
 }
 
-TEST_P(ScriptRunner, ExecCodeWithoutResultFilePassesNull)
+TEST_P(ScriptRunner, ExecCodePassesItsArgumentsAndEmptiesTheResultFileFirst)
 {
     BrickSession& s = openMode();
     ReaderWriter* code = nullptr;
@@ -236,35 +201,32 @@ TEST_P(ScriptRunner, ExecCodeWithoutResultFilePassesNull)
     EXPECT_EQ(call.numbers[0], 17);
     EXPECT_EQ(call.pointers[0], code);
     EXPECT_EQ(call.pointers[1], &result);
-    EXPECT_EQ(call.pointers[2], nullptr);
+    EXPECT_EQ(call.pointers[2], nullptr); // no result file asked for
     EXPECT_EQ(call.pointers[3], reinterpret_cast<const void*>(&SomeCallback));
     EXPECT_EQ(call.pointers[4], &context);
     EXPECT_EQ(result, -9);
     EXPECT_STREQ(lib().codeText, "cmd sound 3");
     BrickSession::ReleaseReaderWriter(&code);
-}
 
-TEST_P(ScriptRunner, ExecCodeEmptiesTheResultFileBeforeTheLibrarySeesIt)
-{
-    BrickSession& s = openMode();
-    ReaderWriter* resultFile = nullptr;
-    std::snprintf(lib().resultText, sizeof lib().resultText, "%s", "first answer, long");
-    ASSERT_EQ(s.ExecCode(1, nullptr, nullptr, &resultFile, nullptr, nullptr), 0);
-    ASSERT_NE(resultFile, nullptr);
-    EXPECT_EQ(resultFile->dirEnt(), s.resultEntry());
-    EXPECT_EQ(resultFile->type(), 0);
-    EXPECT_EQ(lib().resultSizeOnEntry, 0);
-    EXPECT_EQ(contentOf(resultFile), "first answer, long");
-    BrickSession::ReleaseReaderWriter(&resultFile);
-
-    std::snprintf(lib().resultText, sizeof lib().resultText, "%s", "second");
-    lib().results[tessel::SlotExec] = kTranslateError;
-    EXPECT_EQ(s.ExecCode(1, nullptr, nullptr, &resultFile, nullptr, nullptr), kTranslateError);
-    EXPECT_EQ(lib().resultSizeOnEntry, 0);
-    // The caller receives the file whatever the result, and releases it.
-    ASSERT_NE(resultFile, nullptr);
-    EXPECT_EQ(contentOf(resultFile), "second");
-    BrickSession::ReleaseReaderWriter(&resultFile);
+    // The result file reaches the library empty every time, and the caller receives it
+    // whatever the result.
+    const struct {
+        const char* answer;
+        Long result;
+    } runs[] = {{"first answer, long", 0}, {"second", kTranslateError}};
+    for (const auto& run : runs) {
+        SCOPED_TRACE(run.answer);
+        std::snprintf(lib().resultText, sizeof lib().resultText, "%s", run.answer);
+        lib().results[tessel::SlotExec] = run.result;
+        ReaderWriter* resultFile = nullptr;
+        EXPECT_EQ(s.ExecCode(1, nullptr, nullptr, &resultFile, nullptr, nullptr), run.result);
+        EXPECT_EQ(lib().resultSizeOnEntry, 0);
+        ASSERT_NE(resultFile, nullptr);
+        EXPECT_EQ(resultFile->dirEnt(), s.resultEntry());
+        EXPECT_EQ(resultFile->type(), 0);
+        EXPECT_EQ(contentOf(resultFile), run.answer);
+        BrickSession::ReleaseReaderWriter(&resultFile);
+    }
 }
 
 TEST_P(ScriptRunner, RunImmediateTranslatesForOnyx2AndExecutes)
@@ -276,65 +238,15 @@ TEST_P(ScriptRunner, RunImmediateTranslatesForOnyx2AndExecutes)
     EXPECT_EQ(s.RunImmediate(8, "get 0x10,1", &result), 0x21);
     EXPECT_EQ(result, 1234);
     EXPECT_EQ(lib().calls[tessel::SlotTranslate].numbers[0], 6);
-    EXPECT_EQ(lib().calls[tessel::SlotTranslate].pointers[2], nullptr);
     EXPECT_EQ(lib().sourceType, 1);
     EXPECT_STREQ(lib().codeText, "cmd get 0x10,1");
     EXPECT_EQ(lib().calls[tessel::SlotExec].numbers[0], 8);
     EXPECT_EQ(lib().calls[tessel::SlotExec].pointers[2], nullptr);
-    EXPECT_EQ(lib().calls[tessel::SlotExec].pointers[3], nullptr);
-}
-
-TEST_P(ScriptRunner, RunImmediateStopsAtAFailedTranslation)
-{
-    BrickSession& s = openMode();
-    lib().results[tessel::SlotTranslate] = kTranslateError;
-    EXPECT_EQ(s.RunImmediate(8, "sound 4", nullptr), kTranslateError);
-    EXPECT_EQ(lib().calls[tessel::SlotExec].count, 0);
-}
-
-TEST_P(ScriptRunner, ContentSizeAndCountCommandsOfFiles)
-{
-    BrickSession& s = openMode();
-    ReaderWriter* code = nullptr;
-    ASSERT_EQ(s.TranslateText(6, 4, "", &code, nullptr, nullptr, nullptr), 0);
-    EXPECT_EQ(BrickSession::ContentSize(code), 0);
-    EXPECT_EQ(BrickSession::CountCommands(code), 0);
-    BrickSession::ReleaseReaderWriter(&code);
-
-    ASSERT_EQ(s.TranslateText(6, 4, "cmd 1,2;cmd 3", &code, nullptr, nullptr, nullptr), 0);
-    EXPECT_EQ(BrickSession::ContentSize(code), 13);
-    EXPECT_EQ(BrickSession::CountCommands(code), 2);
-    BrickSession::ReleaseReaderWriter(&code);
-
-    ASSERT_EQ(s.TranslateText(6, 4, "cmdcmdcm d c md", &code, nullptr, nullptr, nullptr), 0);
-    EXPECT_EQ(BrickSession::CountCommands(code), 2);
-    BrickSession::ReleaseReaderWriter(&code);
-}
-
-TEST_P(ScriptRunner, UnreadableFileHasNoSizeAndNoCommands)
-{
-    BrickSession& s = openMode();
-    DirEnt* missing = s.MountDiskFile("absent.bin", dir.path().c_str(), "/Extra/");
-    ASSERT_NE(missing, nullptr);
-    ReaderWriter* handle = missing->open(4);
-    EXPECT_EQ(BrickSession::ContentSize(handle), 0);
-    EXPECT_EQ(BrickSession::CountCommands(handle), 0);
-    BrickSession::ReleaseReaderWriter(&handle);
-}
-
-TEST(ScriptRunnerStatics, NullHandlesAreHarmless)
-{
-    EXPECT_EQ(BrickSession::ContentSize(nullptr), 0);
-    EXPECT_EQ(BrickSession::CountCommands(nullptr), 0);
-    BrickSession::ReleaseReaderWriter(nullptr);
-    ReaderWriter* none = nullptr;
-    BrickSession::ReleaseReaderWriter(&none);
-    EXPECT_EQ(none, nullptr);
 }
 
 class ScriptRunnerFiles : public SessionTest {};
 
-TEST_F(ScriptRunnerFiles, CountStopsAtTheFirstZeroByte)
+TEST_F(ScriptRunnerFiles, SizesAndCountsOfOddFilesAndHandles)
 {
     BrickSession& s = open();
     ReaderWriter* handle = s.CreateMemoryFile("bytes.bin", "/Extra/")->open(4);
@@ -342,14 +254,20 @@ TEST_F(ScriptRunnerFiles, CountStopsAtTheFirstZeroByte)
     handle->write("cmd\0cmd cmd", 11);
     handle->close();
     EXPECT_EQ(BrickSession::ContentSize(handle), 11);
-    EXPECT_EQ(BrickSession::CountCommands(handle), 1);
+    EXPECT_EQ(BrickSession::CountCommands(handle), 1); // counting stops at the zero byte
     BrickSession::ReleaseReaderWriter(&handle);
-}
 
-TEST_F(ScriptRunnerFiles, ReleaseKeepsAHandleOthersStillHold)
-{
-    BrickSession& s = open();
-    ReaderWriter* handle = s.sourceEntry()->open(1);
+    handle = s.MountDiskFile("absent.bin", dir.path().c_str(), "/Extra/")->open(4);
+    EXPECT_EQ(BrickSession::ContentSize(handle), 0);
+    EXPECT_EQ(BrickSession::CountCommands(handle), 0);
+    BrickSession::ReleaseReaderWriter(&handle);
+
+    EXPECT_EQ(BrickSession::ContentSize(nullptr), 0);
+    EXPECT_EQ(BrickSession::CountCommands(nullptr), 0);
+    BrickSession::ReleaseReaderWriter(nullptr);
+
+    // Release keeps a handle others still hold.
+    handle = s.sourceEntry()->open(1);
     handle->addRef();
     ReaderWriter* mine = handle;
     BrickSession::ReleaseReaderWriter(&mine);
@@ -357,10 +275,6 @@ TEST_F(ScriptRunnerFiles, ReleaseKeepsAHandleOthersStillHold)
     BrickSession::ReleaseReaderWriter(&mine);
     EXPECT_EQ(mine, nullptr);
 }
-
-} // namespace
-
-namespace {
 
 // The codes the runner builds are the ones the catalogue explains.
 TEST(ScriptRunnerCodes, EachCodeHasItsCatalogueText)
@@ -383,9 +297,6 @@ TEST(ScriptRunnerCodes, EachCodeHasItsCatalogueText)
         EXPECT_THAT(GetErrorText(static_cast<tessel::Long>(entry.code), nullptr),
                     ::testing::HasSubstr(entry.text));
     }
-    EXPECT_EQ(ErrorValue(3, 5, 3, 129).packedCode(), BrickSession::kNullRoot);
-    EXPECT_EQ(ErrorValue(3, 5, 3, 135).packedCode(), BrickSession::kNullTempPath);
-    EXPECT_EQ(ErrorValue(3, 5, 3, 65).packedCode(), tessel::kLinkFailed);
 }
 
 } // namespace

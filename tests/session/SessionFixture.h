@@ -1,5 +1,5 @@
 // A session over the recording test library, built from a settings file in a scratch
-// directory, with a check that no workspace object outlives it.
+// directory that is also the current one, with a check that no workspace object outlives it.
 #pragma once
 
 #include <gtest/gtest.h>
@@ -21,10 +21,17 @@ protected:
         ASSERT_TRUE(library.loaded()) << "recording library missing beside the tests";
         ASSERT_FALSE(dir.path().empty());
         ASSERT_EQ(workspace::LiveObjectCount(), 0);
+        // A disk-mode workspace without PATHS names its files relative to the current
+        // directory; run in the scratch directory so no test writes into the source tree.
+        previousDirectory = std::filesystem::current_path();
+        std::filesystem::current_path(dir.path());
     }
 
     void TearDown() override
     {
+        if (!previousDirectory.empty()) {
+            std::filesystem::current_path(previousDirectory);
+        }
         session.reset();
         EXPECT_EQ(workspace::LiveObjectCount(), 0) << "workspace objects outlived the session";
     }
@@ -67,17 +74,6 @@ protected:
         return text;
     }
 
-    static std::string pathOf(DirEnt* entry)
-    {
-        if (entry == nullptr) {
-            return "<null>";
-        }
-        char* path = entry->path();
-        std::string copy = path != nullptr ? path : "<no memory>";
-        std::free(path);
-        return copy;
-    }
-
     RecordingState& lib() { return library.state(); }
     DirEnt* find(const char* path) { return session->root()->find(path); }
 
@@ -85,4 +81,5 @@ protected:
     testsupport::TempDirectory dir;
     std::string settingsPath;
     std::unique_ptr<BrickSession> session;
+    std::filesystem::path previousDirectory;
 };
