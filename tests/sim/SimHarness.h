@@ -1,6 +1,7 @@
 // Test harness for the simulated brick library: loads Tessel.dll by absolute path as the client
 // does, finds the sixteen entry points through its export table, builds a real workspace tree
-// with the client's workspace classes, and records callbacks that arrive from library threads.
+// with the client's workspace classes, records callbacks that arrive from library threads, and
+// writes object text by hand so that the tests do not depend on the translator.
 #pragma once
 
 #include <dlfcn.h>
@@ -24,79 +25,58 @@
 
 namespace simtest {
 
-struct Api {
-    void* module = nullptr;
-    const tessel::ExportEntry* table = nullptr;
-    tessel::InitialiseFn initialise = nullptr;
-    tessel::TerminateFn terminate = nullptr;
-    tessel::FindPortFn findPort = nullptr;
-    tessel::CreateFn create = nullptr;
-    tessel::DestroyFn destroy = nullptr;
-    tessel::FindBrickFn findBrick = nullptr;
-    tessel::StatusFn status = nullptr;
-    tessel::SetFn set = nullptr;
-    tessel::GetFn get = nullptr;
-    tessel::ValidateFn validate = nullptr;
-    tessel::TranslateFn translate = nullptr;
-    tessel::ExecFn exec = nullptr;
-    tessel::DownloadFn download = nullptr;
-    tessel::InfoFn info = nullptr;
-    tessel::FindFirstFn findFirst = nullptr;
-    tessel::FindNextFn findNext = nullptr;
-};
+using tessel::Long;
+using tessel::Short;
 
-inline void* Lookup(const tessel::ExportEntry* table, const char* name)
+inline constexpr Long Code(std::uint32_t packed)
 {
-    for (const tessel::ExportEntry* entry = table; entry != nullptr && entry->name != nullptr;
-         ++entry) {
-        if (std::strcmp(entry->name, name) == 0) {
-            return entry->address;
-        }
-    }
-    return nullptr;
+    return static_cast<Long>(packed);
 }
+inline constexpr Long kNoMoreItems = Code(0xE0050C52u);
+inline constexpr Long kNullParameter = Code(0xE0050C64u);
+inline constexpr Long kBadHandle = Code(0xE0050401u);
+inline const char* const kVersion309 = "0x00,0x03,0x00,0x01,0x00,0x03,0x00,0x09";
 
 // Loaded once for the whole test program, never unloaded (library threads are joined by
-// tslTerminate in every test's tear-down).
+// tslTerminate in every test's tear-down). Entry points are taken from the export table by slot,
+// whose order ExportTable.NamesTheSixteenEntryPointsInSlotOrder checks.
+struct Api {
+    void* module = dlopen(TESSEL_SIM_MODULE, RTLD_NOW | RTLD_LOCAL);
+    const tessel::ExportEntry* table =
+        module == nullptr
+            ? nullptr
+            : static_cast<const tessel::ExportEntry*>(dlsym(module, tessel::kExportTableSymbol));
+    template <typename Fn> Fn at(int slot) const
+    {
+        return table == nullptr ? nullptr : reinterpret_cast<Fn>(table[slot].address);
+    }
+    tessel::InitialiseFn initialise = at<tessel::InitialiseFn>(tessel::SlotInitialise);
+    tessel::TerminateFn terminate = at<tessel::TerminateFn>(tessel::SlotTerminate);
+    tessel::FindPortFn findPort = at<tessel::FindPortFn>(tessel::SlotFindPort);
+    tessel::CreateFn create = at<tessel::CreateFn>(tessel::SlotCreate);
+    tessel::DestroyFn destroy = at<tessel::DestroyFn>(tessel::SlotDestroy);
+    tessel::FindBrickFn findBrick = at<tessel::FindBrickFn>(tessel::SlotFindBrick);
+    tessel::StatusFn status = at<tessel::StatusFn>(tessel::SlotStatus);
+    tessel::SetFn set = at<tessel::SetFn>(tessel::SlotSet);
+    tessel::GetFn get = at<tessel::GetFn>(tessel::SlotGet);
+    tessel::ValidateFn validate = at<tessel::ValidateFn>(tessel::SlotValidate);
+    tessel::TranslateFn translate = at<tessel::TranslateFn>(tessel::SlotTranslate);
+    tessel::ExecFn exec = at<tessel::ExecFn>(tessel::SlotExec);
+    tessel::DownloadFn download = at<tessel::DownloadFn>(tessel::SlotDownload);
+    tessel::InfoFn info = at<tessel::InfoFn>(tessel::SlotInfo);
+    tessel::FindFirstFn findFirst = at<tessel::FindFirstFn>(tessel::SlotFindFirst);
+    tessel::FindNextFn findNext = at<tessel::FindNextFn>(tessel::SlotFindNext);
+};
+
 inline const Api& Library()
 {
-    static const Api api = [] {
-        Api a;
-        a.module = dlopen(TESSEL_SIM_MODULE, RTLD_NOW | RTLD_LOCAL);
-        if (a.module == nullptr) {
-            return a;
-        }
-        a.table =
-            static_cast<const tessel::ExportEntry*>(dlsym(a.module, tessel::kExportTableSymbol));
-        auto bind = [&](auto& slot, int index) {
-            slot = reinterpret_cast<std::remove_reference_t<decltype(slot)>>(
-                Lookup(a.table, tessel::kExportNames[index]));
-        };
-        bind(a.initialise, tessel::SlotInitialise);
-        bind(a.terminate, tessel::SlotTerminate);
-        bind(a.findPort, tessel::SlotFindPort);
-        bind(a.create, tessel::SlotCreate);
-        bind(a.destroy, tessel::SlotDestroy);
-        bind(a.findBrick, tessel::SlotFindBrick);
-        bind(a.status, tessel::SlotStatus);
-        bind(a.set, tessel::SlotSet);
-        bind(a.get, tessel::SlotGet);
-        bind(a.validate, tessel::SlotValidate);
-        bind(a.translate, tessel::SlotTranslate);
-        bind(a.exec, tessel::SlotExec);
-        bind(a.download, tessel::SlotDownload);
-        bind(a.info, tessel::SlotInfo);
-        bind(a.findFirst, tessel::SlotFindFirst);
-        bind(a.findNext, tessel::SlotFindNext);
-        return a;
-    }();
+    static const Api api;
     return api;
 }
 
-// One callback report as the library made it.
 struct Report {
-    tessel::Long status;
-    tessel::Long count;
+    Long status;
+    Long count;
     ReaderWriter* result;
 };
 
@@ -104,8 +84,7 @@ struct Report {
 // left for the test thread to release: the workspace is not thread-safe.
 class Recorder {
 public:
-    static int TSL_STDCALL Callback(tessel::Long status, void* context, tessel::Long count,
-                                    ReaderWriter* result)
+    static int TSL_STDCALL Callback(Long status, void* context, Long count, ReaderWriter* result)
     {
         auto* recorder = static_cast<Recorder*>(context);
         std::lock_guard<std::mutex> lock(recorder->mutex_);
@@ -114,20 +93,16 @@ public:
         return 1;
     }
 
-    // Waits until at least n reports arrived; the bound only keeps a broken library from
-    // hanging the suite and is no statement about speed.
+    // The bound only keeps a broken library from hanging the suite; no statement about speed.
     bool waitFor(std::size_t n)
     {
-        std::unique_lock<std::mutex> lock(mutex_);
-        return changed_.wait_for(lock, std::chrono::seconds(60),
-                                 [&] { return reports_.size() >= n; });
+        return waitUntil([&] { return reports_.size() >= n; });
     }
 
     // Waits for a report that ends a download: a failure or the given total.
-    bool waitForEnd(tessel::Long total)
+    bool waitForEnd(Long total)
     {
-        std::unique_lock<std::mutex> lock(mutex_);
-        return changed_.wait_for(lock, std::chrono::seconds(60), [&] {
+        return waitUntil([&] {
             return !reports_.empty() &&
                    (reports_.back().status < 0 || reports_.back().count == total);
         });
@@ -140,6 +115,12 @@ public:
     }
 
 private:
+    template <typename Done> bool waitUntil(Done done)
+    {
+        std::unique_lock<std::mutex> lock(mutex_);
+        return changed_.wait_for(lock, std::chrono::seconds(60), done);
+    }
+
     std::mutex mutex_;
     std::condition_variable changed_;
     std::vector<Report> reports_;
@@ -148,9 +129,8 @@ private:
 // The client's workspace as the session builds it in memory mode.
 class Workspace {
 public:
-    Workspace()
+    Workspace() : root_(new Directory())
     {
-        root_ = new Directory();
         root_->addRef();
         for (const char* name : {"source.txt", "object.txt", "result.txt", "opal.txt", "temp.tmp",
                                  "context.txt", "symtab.txt", "firmware.txt"}) {
@@ -165,8 +145,6 @@ public:
     {
         root_->insert(path.c_str(), new TextMemoryEntry(new MemoryBlock()));
     }
-
-    DirEnt* root() { return root_; }
 
     // A new handle (count 1) on a file of the tree; the caller releases it.
     ReaderWriter* open(const std::string& path, std::int32_t type)
@@ -202,8 +180,7 @@ public:
             return text;
         }
         char buffer[512];
-        std::int32_t got = 0;
-        while ((got = handle->read(buffer, sizeof buffer)) > 0) {
+        for (std::int32_t got; (got = handle->read(buffer, sizeof buffer)) > 0;) {
             text.append(buffer, static_cast<std::size_t>(got));
         }
         handle->close();
@@ -218,7 +195,7 @@ public:
     }
 
 private:
-    Directory* root_ = nullptr;
+    Directory* root_;
 };
 
 // Every test starts from a scenario and ends with the library terminated, its threads joined
@@ -248,13 +225,7 @@ protected:
     static const Api& api() { return Library(); }
 
     // Restarts the library with a scenario file shipped in resources/scenarios.
-    void useShipped(const char* name)
-    {
-        const std::string path = std::string(TESSEL_SCENARIO_DIR) + "/" + name;
-        setenv("TESSEL_SIM", path.c_str(), 1);
-        api().terminate();
-        api().initialise();
-    }
+    void useShipped(const char* name) { restart(std::string(TESSEL_SCENARIO_DIR) + "/" + name); }
 
     // Restarts the library with scenario text of the test's own.
     void useScenario(const std::string& text)
@@ -270,9 +241,7 @@ protected:
         ASSERT_NE(file, nullptr);
         std::fwrite(text.data(), 1, text.size(), file);
         std::fclose(file);
-        setenv("TESSEL_SIM", scenarioFile_.c_str(), 1);
-        api().terminate();
-        api().initialise();
+        restart(scenarioFile_);
     }
 
     Workspace& ws()
@@ -283,15 +252,17 @@ protected:
         return *workspace_;
     }
 
-    tessel::Long open(const char* port) { return api().create(port); }
+    Long open(const char* port) { return api().create(port); }
 
-    // Runs object text on the brick; the answer text lands in result.
-    tessel::Long run(tessel::Long handle, const std::string& objectText, tessel::Long* number,
-                     std::string* text = nullptr)
+    // Runs object text on the brick; the answer text lands in text.
+    Long run(Long handle, const std::string& objectText, Long* number = nullptr,
+             std::string* text = nullptr)
     {
+        Long ignored = 0;
         ReaderWriter* code = ws().code(objectText);
         ReaderWriter* result = ws().open("/Script/Temp/result.txt", tessel::FileResult);
-        const tessel::Long status = api().exec(handle, code, number, result, nullptr, nullptr);
+        const Long status =
+            api().exec(handle, code, number ? number : &ignored, result, nullptr, nullptr);
         if (text != nullptr) {
             *text = Workspace::ReadHandle(result);
         }
@@ -301,11 +272,10 @@ protected:
     }
 
     // Downloads object text with a recorder; waits for its end.
-    tessel::Long downloadAndWait(tessel::Long handle, const std::string& objectText,
-                                 Recorder& recorder, tessel::Long total)
+    Long downloadAndWait(Long handle, const std::string& objectText, Recorder& recorder, Long total)
     {
         ReaderWriter* code = ws().code(objectText);
-        const tessel::Long status = api().download(handle, code, &Recorder::Callback, &recorder);
+        const Long status = api().download(handle, code, &Recorder::Callback, &recorder);
         code->release();
         if (status >= 0) {
             EXPECT_TRUE(recorder.waitForEnd(total));
@@ -314,14 +284,76 @@ protected:
     }
 
 private:
+    void restart(const std::string& scenario)
+    {
+        setenv("TESSEL_SIM", scenario.c_str(), 1);
+        api().terminate();
+        api().initialise();
+    }
+
     std::int64_t liveBefore_ = 0;
     std::string scenarioFile_;
     Workspace* workspace_ = nullptr;
 };
 
-inline constexpr tessel::Long Code(std::uint32_t packed)
+// Object text: one "cmd" line per instruction, bytes in hexadecimal (see sim/lang/Program.h).
+inline std::string Immediate(const std::string& commands, int brickType = 6)
 {
-    return static_cast<tessel::Long>(packed);
+    return "tobj 1 " + std::to_string(brickType) + " immediate\n" + commands;
+}
+
+inline std::string Cmd(const char* format, int a = 0, int b = 0, int c = 0, int d = 0)
+{
+    char line[64];
+    std::snprintf(line, sizeof line, format, a, b, c, d);
+    return line;
+}
+
+inline std::string Sound(int sound)
+{
+    return Cmd("cmd 20 %02x\n", sound & 0xFF);
+}
+inline std::string SelectSlot(int slot)
+{
+    return Cmd("cmd 39 %02x\n", slot);
+}
+inline std::string Get(int address, int count)
+{
+    return Cmd("cmd 33 %02x %02x %02x %02x\n", address & 0xFF, address >> 8, count & 0xFF,
+               count >> 8);
+}
+
+inline const char* kGetMap = "cmd 34\n";
+inline const char* kVersion = "cmd 32\n";
+inline const char* kAlive = "cmd 35\n";
+inline const char* kBootRom = "cmd 36\n";
+inline const char* kBootFirmware = "cmd 37\n";
+inline const char* kClearTasks = "cmd 30\n";
+inline const char* kStartMain = "cmd 14 00\n";
+
+// main sends message `message` and ends: 4 + 1 bytes, two commands.
+inline std::string MessageProgram(int message, int brickType = 6)
+{
+    return Cmd("tobj 1 %d program\ntask 0\ncmd 27 02 %02x 00\ncmd 17\nend\n", brickType, message);
+}
+
+// A program of `commands` sound commands in main (2 bytes each) plus its end.
+inline std::string SoundProgram(int commands)
+{
+    std::string text = "tobj 1 6 program\ntask 0\n";
+    for (int i = 0; i < commands; ++i) {
+        text += "cmd 20 01\n";
+    }
+    return text + "cmd 17\nend\n";
+}
+
+inline std::string Firmware(int version, int records)
+{
+    std::string text = Cmd("tobj 1 6 firmware %04d\n", version);
+    for (int i = 0; i < records; ++i) {
+        text += Cmd("cmd fw %04x 01 02 03 04\n", 0x1000 + 4 * i);
+    }
+    return text;
 }
 
 } // namespace simtest

@@ -3,59 +3,49 @@
 #include <atomic>
 #include <thread>
 
-#include "Objects.h"
 #include "SimHarness.h"
 
 namespace simtest {
 namespace {
 
-using tessel::Long;
-using tessel::Short;
-
 class Callbacks : public SimTest {
 protected:
-    void SetUp() override
+    // Starts an asynchronous exec of object text.
+    Long execAsync(Long handle, const std::string& objectText, tessel::Callback callback,
+                   void* context)
     {
-        SimTest::SetUp();
-        handle_ = open("KIVOTOWER1");
-        ASSERT_NE(handle_, 0);
+        Long number = 0;
+        ReaderWriter* code = ws().code(objectText);
+        const Long status = api().exec(handle, code, &number, nullptr, callback, context);
+        code->release();
+        return status;
     }
-    Long handle_ = 0;
 };
 
-TEST_F(Callbacks, AsyncExecHandsTheResultFileToTheCallback)
+TEST_F(Callbacks, AsyncExecHandsTheResultOrTheFailureToTheCallback)
 {
     Recorder recorder;
-    Long number = -1;
-    ReaderWriter* code = ws().code(Immediate(kVersion));
-    ASSERT_EQ(api().exec(handle_, code, &number, nullptr, &Recorder::Callback, &recorder), 0);
-    code->release();
+    ASSERT_EQ(execAsync(open("KIVOTOWER1"), Immediate(kVersion), &Recorder::Callback, &recorder),
+              0);
     ASSERT_TRUE(recorder.waitFor(1));
     const Report report = recorder.reports().front();
     EXPECT_EQ(report.status, 0);
     ASSERT_NE(report.result, nullptr);
-    EXPECT_EQ(Workspace::ReadHandle(report.result), "0x00,0x03,0x00,0x01,0x00,0x03,0x00,0x09");
+    EXPECT_EQ(Workspace::ReadHandle(report.result), kVersion309);
     report.result->release();
-}
 
-TEST_F(Callbacks, AsyncExecReportsAFailureThroughTheCallback)
-{
     useShipped("brick-off.sim");
-    const Long handle = open("KIVOTOWER1");
-    Recorder recorder;
-    Long number = 0;
-    ReaderWriter* code = ws().code(Immediate(Sound(4)));
-    ASSERT_EQ(api().exec(handle, code, &number, nullptr, &Recorder::Callback, &recorder), 0);
-    code->release();
-    ASSERT_TRUE(recorder.waitFor(1));
-    EXPECT_EQ(recorder.reports().front().status, Code(0xE0050402u));
-    EXPECT_EQ(recorder.reports().front().result, nullptr);
+    Recorder failed;
+    ASSERT_EQ(execAsync(open("KIVOTOWER1"), Immediate(Sound(4)), &Recorder::Callback, &failed), 0);
+    ASSERT_TRUE(failed.waitFor(1));
+    EXPECT_EQ(failed.reports().front().status, Code(0xE0050402u));
+    EXPECT_EQ(failed.reports().front().result, nullptr);
 }
 
 TEST_F(Callbacks, DownloadProgressCountsUpToTheTotal)
 {
     Recorder recorder;
-    ASSERT_EQ(downloadAndWait(handle_, SoundProgram(99), recorder, 100), 0);
+    ASSERT_EQ(downloadAndWait(open("KIVOTOWER1"), SoundProgram(99), recorder, 100), 0);
     const std::vector<Report> reports = recorder.reports();
     ASSERT_GE(reports.size(), 2u);
     Long previous = 0;
@@ -76,8 +66,7 @@ TEST_F(Callbacks, ReceptionDeliversScenarioAndProgramMessages)
     Recorder recorder;
     ASSERT_EQ(api().exec(handle, nullptr, nullptr, nullptr, &Recorder::Callback, &recorder), 0);
     ASSERT_TRUE(recorder.waitFor(3));
-    Long number = 0;
-    ASSERT_EQ(run(handle, Immediate(kStartMain), &number), 0);
+    ASSERT_EQ(run(handle, Immediate(kStartMain)), 0);
     ASSERT_TRUE(recorder.waitFor(4));
     EXPECT_EQ(api().exec(handle, nullptr, nullptr, nullptr, nullptr, nullptr), 0);
     std::vector<Long> numbers;
@@ -87,18 +76,21 @@ TEST_F(Callbacks, ReceptionDeliversScenarioAndProgramMessages)
     }
     EXPECT_EQ(numbers, (std::vector<Long>{3, 7, 12, 42}));
     // Stopped: a program's message now stays with the brick.
-    ASSERT_EQ(run(handle, Immediate(kStartMain), &number), 0);
+    ASSERT_EQ(run(handle, Immediate(kStartMain)), 0);
     EXPECT_EQ(recorder.reports().size(), 4u);
 }
 
-TEST_F(Callbacks, DestroyStopsADownloadAndNoCallbackFollows)
+TEST_F(Callbacks, ASecondJobIsRefusedAndDestroyStopsTheFirstForGood)
 {
     useScenario("link-time = 50\n[brick b]\n[port KIVOTOWER1]\n");
     const Long handle = open("KIVOTOWER1");
     Recorder recorder;
     ReaderWriter* code = ws().code(SoundProgram(400));
     ASSERT_EQ(api().download(handle, code, &Recorder::Callback, &recorder), 0);
+    EXPECT_EQ(api().download(handle, code, &Recorder::Callback, &recorder), Code(0xE005040Au));
     code->release();
+    char text[tessel::kStatusTextSize];
+    EXPECT_EQ(api().status(handle, tessel::StatusBrick, text, sizeof text), 12);
     ASSERT_EQ(api().destroy(handle), 0);
     const std::size_t seen = recorder.reports().size();
     EXPECT_LT(seen, 10u);
@@ -113,12 +105,10 @@ TEST_F(Callbacks, TerminateStopsReceptionAndAsyncWork)
     Recorder messages;
     Recorder exec;
     const Long usb = open("KIVOTOWER1");
-    const Long serial = open("COM1");
     ASSERT_EQ(api().exec(usb, nullptr, nullptr, nullptr, &Recorder::Callback, &messages), 0);
-    ReaderWriter* code = ws().code(Immediate(Sound(4) + Sound(5) + Sound(6)));
-    Long number = 0;
-    ASSERT_EQ(api().exec(serial, code, &number, nullptr, &Recorder::Callback, &exec), 0);
-    code->release();
+    ASSERT_EQ(execAsync(open("COM1"), Immediate(Sound(4) + Sound(5) + Sound(6)),
+                        &Recorder::Callback, &exec),
+              0);
     api().terminate();
     const std::size_t seenMessages = messages.reports().size();
     const std::size_t seenExec = exec.reports().size();
@@ -128,21 +118,7 @@ TEST_F(Callbacks, TerminateStopsReceptionAndAsyncWork)
     EXPECT_EQ(exec.reports().size(), seenExec);
 }
 
-TEST_F(Callbacks, ASecondJobWhileOneRunsIsRefused)
-{
-    useScenario("link-time = 50\n[brick b]\n[port KIVOTOWER1]\n");
-    const Long handle = open("KIVOTOWER1");
-    Recorder recorder;
-    ReaderWriter* code = ws().code(SoundProgram(100));
-    ASSERT_EQ(api().download(handle, code, &Recorder::Callback, &recorder), 0);
-    EXPECT_EQ(api().download(handle, code, &Recorder::Callback, &recorder), Code(0xE005040Au));
-    code->release();
-    char text[tessel::kStatusTextSize];
-    EXPECT_EQ(api().status(handle, tessel::StatusBrick, text, sizeof text), 12);
-    api().destroy(handle);
-}
-
-// Callbacks that call back into the library from the library's thread.
+// A callback that calls back into the library from the library's thread.
 struct Reentrant {
     std::atomic<int> calls{0};
     std::atomic<Long> destroyResult{0};
@@ -150,7 +126,7 @@ struct Reentrant {
     const Api* a = nullptr;
 };
 
-int TSL_STDCALL DestroyFromCallback(Long status, void* context, Long count, ReaderWriter* result)
+int TSL_STDCALL DestroyFromCallback(Long, void* context, Long, ReaderWriter*)
 {
     auto* r = static_cast<Reentrant*>(context);
     Short type = 0;
@@ -163,16 +139,13 @@ int TSL_STDCALL DestroyFromCallback(Long status, void* context, Long count, Read
 TEST_F(Callbacks, ACallbackMayCallTheLibraryButNotDestroyItsOwnHandle)
 {
     Reentrant r;
-    r.handle = handle_;
+    r.handle = open("KIVOTOWER1");
     r.a = &api();
-    ReaderWriter* code = ws().code(Immediate(Sound(1)));
-    Long number = 0;
-    ASSERT_EQ(api().exec(handle_, code, &number, nullptr, &DestroyFromCallback, &r), 0);
-    code->release();
+    ASSERT_EQ(execAsync(r.handle, Immediate(Sound(1)), &DestroyFromCallback, &r), 0);
     for (int waited = 0; r.calls == 0 && waited < 60000; ++waited) {
         std::this_thread::sleep_for(std::chrono::milliseconds(1));
     }
-    api().destroy(handle_);
+    api().destroy(r.handle);
     EXPECT_EQ(r.calls, 1);
     EXPECT_EQ(r.destroyResult, Code(0xE005040Au));
 }
