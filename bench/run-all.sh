@@ -57,7 +57,9 @@ def counter(name, key):
     return medians[name][key]
 
 def ms(value):
-    return f"{value * 1e3:.3f} ms" if value >= 1e-4 else f"{value * 1e9:.0f} ns"
+    if value >= 1e-3:
+        return f"{value * 1e3:.2f} ms"
+    return f"{value * 1e6:.1f} us" if value >= 1e-6 else f"{value * 1e9:.0f} ns"
 
 rows = []
 failed = False
@@ -132,6 +134,6 @@ header = ("what", "figure (median)", "baseline (same run)", "ratio", "cpu ratio"
           "result")
 widths = [max(len(str(r[i])) for r in rows + [header]) for i in range(len(header))]
 for line in [header, tuple("-" * w for w in widths)] + rows:
-    print(" | ".join(str(cell).ljust(width) for cell, width in zip(line, widths)))
+    print("| " + " | ".join(str(cell).ljust(width) for cell, width in zip(line, widths)) + " |")
 sys.exit(1 if failed else 0)
 PY
