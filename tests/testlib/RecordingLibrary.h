@@ -26,11 +26,10 @@ struct RecordingState {
     char textOut[64] = {};
 
     // tslTranslate: what it read from the source and the types of both handles; on success
-    // it writes targetText (or, when empty, "cmd " followed by the source) into the target.
+    // it writes "cmd " followed by the source into the target.
     char sourceText[4096] = {};
     std::int32_t sourceType = -1;
     std::int32_t targetType = -1;
-    char targetText[256] = {};
     // On failure it reports into the sink at this position.
     std::int32_t errorPosition = 0;
 
