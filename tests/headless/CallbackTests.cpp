@@ -53,21 +53,21 @@ ReaderWriter* NewMemoryFile()
 
 } // namespace
 
-TEST_F(CallbackTest, NullContextPostsNothing)
+TEST_F(CallbackTest, EachPostsItsMessageWithStatusCountAndResult)
 {
     EXPECT_EQ(TestClientDialog::DownloadCallback(0, nullptr, 1, nullptr), 0);
     EXPECT_EQ(TestClientDialog::ExecCallback(0, nullptr, 0, nullptr), 0);
     EXPECT_EQ(TestClientDialog::ReceiveCallback(0, nullptr, 3, nullptr), 0);
     EXPECT_EQ(host.QueuedMessages(), 0u);
-}
 
-TEST_F(CallbackTest, EachPostsItsMessageWithStatusAndCount)
-{
+    const std::int64_t before = workspace::LiveObjectCount();
     const auto failure = static_cast<tessel::Long>(0xE0050C41u);
+    ReaderWriter* file = NewMemoryFile();
     EXPECT_EQ(TestClientDialog::DownloadCallback(failure, &target, 16, nullptr), 1);
     EXPECT_EQ(TestClientDialog::ReceiveCallback(0, &target, 7, nullptr), 1);
-    ASSERT_EQ(host.DispatchPending(), 2);
-    ASSERT_EQ(collector.messages.size(), 2u);
+    EXPECT_EQ(TestClientDialog::ExecCallback(0, &target, 0, file), 1);
+    ASSERT_EQ(host.DispatchPending(), 3);
+    ASSERT_EQ(collector.messages.size(), 3u);
     EXPECT_EQ(collector.messages[0].message, kMsgDownloadProgress);
     // The packed code keeps its sign through wParam.
     EXPECT_EQ(static_cast<std::int32_t>(static_cast<std::uint32_t>(collector.messages[0].wParam)),
@@ -75,28 +75,13 @@ TEST_F(CallbackTest, EachPostsItsMessageWithStatusAndCount)
     EXPECT_EQ(collector.messages[0].lParam, 16);
     EXPECT_EQ(collector.messages[1].message, kMsgBrickMessage);
     EXPECT_EQ(collector.messages[1].lParam, 7);
-}
-
-TEST_F(CallbackTest, ExecutionResultTravelsWithItsMessage)
-{
-    const std::int64_t before = workspace::LiveObjectCount();
-    ReaderWriter* file = NewMemoryFile();
-    ASSERT_NE(file, nullptr);
-    EXPECT_EQ(TestClientDialog::ExecCallback(0, &target, 0, file), 1);
-    host.DispatchPending();
-    ASSERT_EQ(collector.messages.size(), 1u);
-    EXPECT_EQ(collector.messages[0].message, kMsgExecResult);
-    EXPECT_EQ(collector.messages[0].lParam, reinterpret_cast<LParam>(file));
+    EXPECT_EQ(collector.messages[2].message, kMsgExecResult);
+    EXPECT_EQ(collector.messages[2].lParam, reinterpret_cast<LParam>(file));
     file->release();
-    EXPECT_EQ(workspace::LiveObjectCount(), before);
-}
 
-TEST_F(CallbackTest, ResultForAWindowThatIsGoneIsReleased)
-{
-    const std::int64_t before = workspace::LiveObjectCount();
+    // A result for a window that is gone is released.
     host.DestroyWindow(window);
-    ReaderWriter* file = NewMemoryFile();
-    EXPECT_EQ(TestClientDialog::ExecCallback(0, &target, 0, file), 1);
+    EXPECT_EQ(TestClientDialog::ExecCallback(0, &target, 0, NewMemoryFile()), 1);
     EXPECT_EQ(workspace::LiveObjectCount(), before);
 }
 

@@ -46,91 +46,60 @@ TEST(RunnerEscapes, ControlCharactersAreWrittenAsEscapes)
     EXPECT_EQ(HeadlessRunner::Unescape("end\\"), "end\\");
 }
 
-TEST_F(RunnerTest, SucceedingCommandsGiveZero)
+TEST_F(RunnerTest, StatusAndTranscriptOfEachKindOfRun)
 {
-    EXPECT_EQ(Run("# a comment\n\nEditor task main\\r\\n{\\r\\n}\n"
-                  "Expect Editor task main\\r\\n{\\r\\n}\nBrick Rover\nSource raw\n"
-                  "Auto Run on\nPrint title\n"),
-              HeadlessOk)
-        << out.str() << err.str();
-    EXPECT_EQ(run, 6);
-    EXPECT_EQ(failed, 0);
-    EXPECT_NE(out.str().find("> Editor task main"), std::string::npos);
-    EXPECT_NE(out.str().find("title: Tessel Test Client\n"), std::string::npos);
-    EXPECT_NE(out.str().find("done: 6 commands, 0 failed"), std::string::npos);
-    EXPECT_TRUE(err.str().empty());
-}
-
-TEST_F(RunnerTest, FailureShownMakesTheRunFail)
-{
-    // Without a port the port commands answer "Port not open".
-    EXPECT_EQ(Run("Statistics\nEditor x\n"), HeadlessFailed) << out.str();
-    EXPECT_EQ(failed, 1);
-    EXPECT_NE(out.str().find("status: Port not open"), std::string::npos);
-}
-
-TEST_F(RunnerTest, ExpectationsThatDoNotHoldFail)
-{
-    EXPECT_EQ(Run("Editor abc\nExpect Editor abd\nExpect Title Tessel Test Client\n"),
-              HeadlessFailed);
-    EXPECT_EQ(failed, 1);
-    EXPECT_NE(out.str().find("expect: editor is \"abc\""), std::string::npos);
-}
-
-TEST_F(RunnerTest, DisabledButtonIsRefused)
-{
-    EXPECT_EQ(Run("Short\n"), HeadlessFailed);
-    EXPECT_NE(out.str().find("refused: Short is disabled"), std::string::npos);
-}
-
-TEST_F(RunnerTest, UnknownCommandEndsTheRunWithTwo)
-{
-    EXPECT_EQ(Run("Editor x\nFrobnicate now\nEditor y\n"), HeadlessBadCommand);
-    EXPECT_EQ(err.str(), "harbor: unknown command \"Frobnicate\" (line 2)\n");
-    EXPECT_EQ(out.str().find("Editor y"), std::string::npos);
-    // The window was closed all the same.
-    EXPECT_TRUE(host().QuitRequested());
-    EXPECT_EQ(dialog().session(), nullptr);
-}
-
-TEST_F(RunnerTest, BadArgumentEndsTheRunWithTwo)
-{
+    const struct {
+        const char* script;
+        const char* settings;
+        int status;
+        int failed;
+        const char* out; // expected in the transcript
+        const char* err; // the whole error output
+    } cases[] = {
+        {"# a comment\n\nEditor task main\\r\\n{\\r\\n}\nExpect Editor task main\\r\\n{\\r\\n}\n"
+         "Brick Rover\nSource raw\nAuto Run on\nPrint title\n",
+         "", HeadlessOk, 0, "title: Tessel Test Client\ndone: 6 commands, 0 failed", ""},
+        // Without a port the port commands answer "Port not open".
+        {"Statistics\nEditor x\n", "", HeadlessFailed, 1, "status: Port not open", ""},
+        {"Editor abc\nExpect Editor abd\nExpect Title Tessel Test Client\n", "", HeadlessFailed, 1,
+         "expect: editor is \"abc\"", ""},
+        {"Short\n", "", HeadlessFailed, 1, "refused: Short is disabled", ""},
+        {"Help 2002\n", "", HeadlessFailed, 1, "refused: no help is open", ""},
+        {"editor x\nEXPECT EDITOR x\n", "", HeadlessOk, 0, "> editor x", ""},
+        {"Editor x\nExit\nFrobnicate\n", "", HeadlessOk, 0, "> Exit", ""},
+        {"Editor x\nFrobnicate now\nEditor y\n", "", HeadlessBadCommand, 0, "> Editor x",
+         "harbor: unknown command \"Frobnicate\" (line 2)\n"},
+        {"Editorx\n", "", HeadlessBadCommand, 0, "",
+         "harbor: unknown command \"Editorx\" (line 1)\n"},
+        // Both towers are offered; queued answers or the port named pick the second.
+        {"Answer no yes\nOpen\n", "", HeadlessOk, 0,
+         "question: Select Port: KIVOTOWER1 -> no\nquestion: Select Port: COM1 -> yes", ""},
+        {"Open COM1\n", "", HeadlessOk, 0,
+         "question: Select Port: KIVOTOWER1 -> no\nquestion: Select Port: COM1 -> yes", ""},
+        {"Print status\n", "[PORTS]\nUSB=KIVOTOWER1\n", HeadlessOk, 0,
+         "status: Opened \\\\.\\KIVOTOWER1, Onyx2 brick\n> Print status", ""},
+    };
+    for (const auto& c : cases) {
+        SCOPED_TRACE(c.script);
+        out.str("");
+        err.str("");
+        EXPECT_EQ(Run(c.script, c.settings), c.status);
+        EXPECT_EQ(failed, c.failed);
+        EXPECT_NE(out.str().find(c.out), std::string::npos) << out.str();
+        EXPECT_EQ(err.str(), c.err);
+        // The window is closed however the run ends, and nothing after the end is run.
+        EXPECT_TRUE(host().QuitRequested());
+        EXPECT_EQ(dialog().session(), nullptr);
+        EXPECT_EQ(out.str().find("Editor y"), std::string::npos);
+        Stop();
+    }
+    // The start-up comes before the first command.
+    out.str("");
+    EXPECT_EQ(Run("Print status\n", "[PORTS]\nUSB=KIVOTOWER1\n"), HeadlessOk);
+    EXPECT_EQ(out.str().find("status: Opened"), 0u) << out.str();
+    Stop();
     EXPECT_EQ(Run("Brick Helmsman\n"), HeadlessBadCommand);
     EXPECT_NE(err.str().find("Brick has no entry \"Helmsman\""), std::string::npos);
-}
-
-TEST_F(RunnerTest, NamesIgnoreCaseButNeedTheWholeWord)
-{
-    EXPECT_EQ(Run("editor x\nEXPECT EDITOR x\n"), HeadlessOk) << out.str() << err.str();
-    EXPECT_EQ(Run("Editorx\n"), HeadlessBadCommand);
-}
-
-TEST_F(RunnerTest, ExitStopsReadingCommands)
-{
-    EXPECT_EQ(Run("Editor x\nExit\nFrobnicate\n"), HeadlessOk) << err.str();
-    EXPECT_TRUE(err.str().empty());
-}
-
-TEST_F(RunnerTest, AnswersAreTakenInOrderAndPolicyDecidesTheRest)
-{
-    // Both of the simulator's towers are offered; the queued No then Yes picks the second.
-    EXPECT_EQ(Run("Answer no yes\nOpen\n"), HeadlessOk) << out.str();
-    EXPECT_NE(out.str().find("question: Select Port: KIVOTOWER1 -> no"), std::string::npos);
-    EXPECT_NE(out.str().find("question: Select Port: COM1 -> yes"), std::string::npos);
-}
-
-TEST_F(RunnerTest, OpenChoosesThePortNamed)
-{
-    EXPECT_EQ(Run("Open COM1\n"), HeadlessOk) << out.str();
-    EXPECT_NE(out.str().find("question: Select Port: KIVOTOWER1 -> no"), std::string::npos);
-    EXPECT_NE(out.str().find("question: Select Port: COM1 -> yes"), std::string::npos);
-}
-
-TEST_F(RunnerTest, StartupIsPrintedBeforeTheFirstCommand)
-{
-    EXPECT_EQ(Run("Print status\n", "[PORTS]\nUSB=KIVOTOWER1\n"), HeadlessOk) << out.str();
-    const std::string text = out.str();
-    EXPECT_EQ(text.find("status: Opened \\\\.\\KIVOTOWER1, Onyx2 brick\n"), 0u) << text;
 }
 
 TEST_F(RunnerTest, DownloadIsWaitedForBeforeTheNextCommand)
@@ -145,7 +114,7 @@ TEST_F(RunnerTest, DownloadIsWaitedForBeforeTheNextCommand)
     EXPECT_LT(downloaded, text.find("> Print status"));
 }
 
-TEST_F(RunnerTest, HelpSessionTakesTheFollowingCommands)
+TEST_F(RunnerTest, HelpSessionTakesTheFollowingCommandsAndEndOfInputClosesIt)
 {
     // No tower: the port search fails and the Trouble Shooter is offered.
     SetScenario("link-time = 0\n[brick onyx2]\n[port COM1]\ntower = no\n");
@@ -154,37 +123,24 @@ TEST_F(RunnerTest, HelpSessionTakesTheFollowingCommands)
     EXPECT_EQ(Run("Answer yes\nOpen\nHelp Topic Onyx_ok\nHelp 2000\nEditor after\n"
                   "Expect Editor after\n",
                   "", options),
-              HeadlessFailed)
-        << out.str();
-    const std::string text = out.str();
+              HeadlessFailed);
+    std::string text = out.str();
     const auto offer = text.find("-> yes");
     const auto opened = text.find("[help] opened shooter.hlp");
     const auto topic = text.find("[help] topic Onyx_ok");
     const auto closed = text.find("[help] closed");
-    const auto after = text.find("> Editor after");
     ASSERT_NE(offer, std::string::npos) << text;
     ASSERT_NE(closed, std::string::npos) << text;
     EXPECT_LT(offer, opened);
     EXPECT_LT(opened, topic);
     EXPECT_LT(topic, closed);
-    EXPECT_LT(closed, after);
+    EXPECT_LT(closed, text.find("> Editor after"));
     EXPECT_EQ(failed, 1) << text;
-}
-
-TEST_F(RunnerTest, EndOfInputClosesAnOpenHelpSession)
-{
-    SetScenario("link-time = 0\n[brick onyx2]\n[port COM1]\ntower = no\n");
-    HeadlessOptions options;
-    options.helpDirectory = HARBOR_HELP_DIR;
-    EXPECT_EQ(Run("Answer yes\nOpen\n", "", options), HeadlessFailed) << out.str();
+    Stop();
+    out.str("");
+    EXPECT_EQ(Run("Answer yes\nOpen\n", "", options), HeadlessFailed);
     EXPECT_NE(out.str().find("[help] closed"), std::string::npos) << out.str();
     EXPECT_TRUE(host().QuitRequested());
-}
-
-TEST_F(RunnerTest, HelpWithoutASessionIsRefused)
-{
-    EXPECT_EQ(Run("Help 2002\n"), HeadlessFailed);
-    EXPECT_NE(out.str().find("refused: no help is open"), std::string::npos);
 }
 
 TEST_F(RunnerTest, AnOperationGivenUpOnIsNotWaitedForAgain)

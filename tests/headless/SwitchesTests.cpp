@@ -6,33 +6,27 @@
 using app::FindRegistrationSwitch;
 using app::SwitchAction;
 
-TEST(RegistrationSwitch, CountsOnlyAsTheLastThingOnTheLine)
+TEST(RegistrationSwitch, CountsOnlyAsTheLastThingOnTheLineAfterASeparator)
 {
-    EXPECT_EQ(FindRegistrationSwitch("\"/opt/harbor/harbor\" /RegServer"), SwitchAction::Register);
-    EXPECT_EQ(FindRegistrationSwitch("\"/opt/harbor/harbor\" -RegServer"), SwitchAction::Register);
-    EXPECT_EQ(FindRegistrationSwitch("\"/opt/harbor/harbor\" /unregserver"),
-              SwitchAction::Unregister);
-    EXPECT_EQ(FindRegistrationSwitch("\"/opt/harbor/harbor\" -UNREGSERVER"),
-              SwitchAction::Unregister);
-    EXPECT_EQ(FindRegistrationSwitch("\"/opt/harbor/harbor\" /RegServer robot.onyx2"),
-              SwitchAction::Run);
-    EXPECT_EQ(FindRegistrationSwitch("\"/opt/harbor/harbor\" /RegServer "), SwitchAction::Run);
-}
-
-TEST(RegistrationSwitch, SeparatorsInThePathDoNotTrigger)
-{
-    EXPECT_EQ(FindRegistrationSwitch("\"/opt/my-harbor/harbor\""), SwitchAction::Run);
-    EXPECT_EQ(FindRegistrationSwitch("\"/opt/RegServer/harbor\" file"), SwitchAction::Run);
-    EXPECT_EQ(FindRegistrationSwitch("\"/opt/harbor/RegServer\""), SwitchAction::Run);
-    EXPECT_EQ(FindRegistrationSwitch(""), SwitchAction::Run);
-    EXPECT_EQ(FindRegistrationSwitch(nullptr), SwitchAction::Run);
-}
-
-TEST(RegistrationSwitch, AnyLaterSeparatorMayStartTheSwitch)
-{
-    EXPECT_EQ(FindRegistrationSwitch("\"/h/harbor\" a-b /RegServer"), SwitchAction::Register);
-    EXPECT_EQ(FindRegistrationSwitch("/RegServer"), SwitchAction::Register);
-    EXPECT_EQ(FindRegistrationSwitch("\"/h/harbor\" --RegServer"), SwitchAction::Register);
+    const std::pair<const char*, SwitchAction> cases[] = {
+        {"\"/opt/harbor/harbor\" /RegServer", SwitchAction::Register},
+        {"\"/opt/harbor/harbor\" -RegServer", SwitchAction::Register},
+        {"\"/opt/harbor/harbor\" /unregserver", SwitchAction::Unregister},
+        {"\"/opt/harbor/harbor\" -UNREGSERVER", SwitchAction::Unregister},
+        {"\"/h/harbor\" a-b /RegServer", SwitchAction::Register},
+        {"\"/h/harbor\" --RegServer", SwitchAction::Register},
+        {"/RegServer", SwitchAction::Register},
+        {"\"/opt/harbor/harbor\" /RegServer robot.onyx2", SwitchAction::Run},
+        {"\"/opt/harbor/harbor\" /RegServer ", SwitchAction::Run},
+        {"\"/opt/my-harbor/harbor\"", SwitchAction::Run},
+        {"\"/opt/RegServer/harbor\" file", SwitchAction::Run},
+        {"\"/opt/harbor/RegServer\"", SwitchAction::Run},
+        {"", SwitchAction::Run},
+        {nullptr, SwitchAction::Run},
+    };
+    for (const auto& [line, action] : cases) {
+        EXPECT_EQ(FindRegistrationSwitch(line), action) << (line ? line : "(null)");
+    }
 }
 
 namespace {
