@@ -172,36 +172,24 @@ TEST_F(ProfileReading, KeyListCutAtBufferStillEndsWithEmptyName)
     }
 }
 
+// Puts a variable of the environment back as it was.
+class SavedVariable {
+public:
+    explicit SavedVariable(const char* name) : name_(name), had_(getenv(name) != nullptr)
+    {
+        saved_ = had_ ? getenv(name) : "";
+    }
+    ~SavedVariable() { had_ ? setenv(name_, saved_.c_str(), 1) : unsetenv(name_); }
+
+private:
+    const char* name_;
+    bool had_;
+    std::string saved_;
+};
+
 class ProfileLocation : public ::testing::Test {
 protected:
-    void SetUp() override
-    {
-        saveVariable("XDG_CONFIG_HOME", savedXdg, hadXdg);
-        saveVariable("HOME", savedHome, hadHome);
-    }
-    void TearDown() override
-    {
-        restoreVariable("XDG_CONFIG_HOME", savedXdg, hadXdg);
-        restoreVariable("HOME", savedHome, hadHome);
-    }
-
-    static void saveVariable(const char* name, std::string& saved, bool& had)
-    {
-        const char* current = getenv(name);
-        had = current != nullptr;
-        saved = had ? current : "";
-    }
-    static void restoreVariable(const char* name, const std::string& saved, bool had)
-    {
-        if (had) {
-            setenv(name, saved.c_str(), 1);
-        } else {
-            unsetenv(name);
-        }
-    }
-
-    std::string savedXdg, savedHome;
-    bool hadXdg = false, hadHome = false;
+    SavedVariable xdg{"XDG_CONFIG_HOME"}, home{"HOME"};
     testsupport::TempDirectory dir;
 };
 
