@@ -66,46 +66,32 @@ protected:
     }
 
     // Each runner operation on a session whose set-up may have lost pieces: the first
-    // missing piece it needs decides its code.
+    // missing piece it needs decides its code (kUnchecked: whatever the library says).
     void checkRunner(BrickSession& s, std::set<std::uint32_t>& seen)
     {
-        ReaderWriter* code = reinterpret_cast<ReaderWriter*>(1);
-        const Long translated = s.TranslateText(6, 1, "sound 1", &code, nullptr, nullptr, nullptr);
-        if (s.sourceEntry() == nullptr) {
-            EXPECT_EQ(translated, Code(BrickSession::kNullSourcePath));
-        } else if (s.objectEntry() == nullptr) {
-            EXPECT_EQ(translated, Code(BrickSession::kNullTempPath));
-        } else {
-            EXPECT_EQ(translated, 0);
-        }
-        seen.insert(static_cast<std::uint32_t>(translated));
-        BrickSession::ReleaseReaderWriter(&code);
-
+        constexpr Long kUnchecked = 1;
+        ReaderWriter* out = nullptr;
+        const auto check = [&](Long got, Long expected) {
+            if (expected != kUnchecked) {
+                EXPECT_EQ(got, expected);
+            }
+            if (got != 0) { // the library succeeds here: a failure is the runner's own
+                EXPECT_EQ(out, nullptr);
+            }
+            seen.insert(static_cast<std::uint32_t>(got));
+            BrickSession::ReleaseReaderWriter(&out);
+        };
+        const Long noObject = s.objectEntry() == nullptr ? Code(BrickSession::kNullTempPath) : 0;
         const std::string host = dir.write("host.onyx2", "host");
-        const Long compiled = s.CompileFile(6, 1, host.c_str(), &code, nullptr, nullptr, nullptr);
-        if (s.root() == nullptr) {
-            EXPECT_EQ(compiled, Code(BrickSession::kNullRoot));
-        } else if (s.objectEntry() == nullptr) {
-            EXPECT_EQ(compiled, Code(BrickSession::kNullTempPath));
-        }
-        seen.insert(static_cast<std::uint32_t>(compiled));
-        BrickSession::ReleaseReaderWriter(&code);
-
-        ReaderWriter* resultFile = nullptr;
-        const Long executed = s.ExecCode(1, nullptr, nullptr, &resultFile, nullptr, nullptr);
-        if (s.resultEntry() == nullptr) {
-            EXPECT_EQ(executed, Code(BrickSession::kNullResultPath));
-            EXPECT_EQ(resultFile, nullptr);
-        }
-        seen.insert(static_cast<std::uint32_t>(executed));
-        BrickSession::ReleaseReaderWriter(&resultFile);
-
-        const Long firmware = s.CompileFirmware(host.c_str(), &code);
-        if (s.firmwareEntry() == nullptr) {
-            EXPECT_EQ(firmware, Code(BrickSession::kNullFirmwarePath));
-        }
-        seen.insert(static_cast<std::uint32_t>(firmware));
-        BrickSession::ReleaseReaderWriter(&code);
+        check(s.TranslateText(6, 1, "sound 1", &out, nullptr, nullptr, nullptr),
+              s.sourceEntry() == nullptr ? Code(BrickSession::kNullSourcePath) : noObject);
+        check(s.CompileFile(6, 1, host.c_str(), &out, nullptr, nullptr, nullptr),
+              s.root() == nullptr ? Code(BrickSession::kNullRoot)
+                                  : (noObject != 0 ? noObject : kUnchecked));
+        check(s.ExecCode(1, nullptr, nullptr, &out, nullptr, nullptr),
+              s.resultEntry() == nullptr ? Code(BrickSession::kNullResultPath) : kUnchecked);
+        check(s.CompileFirmware(host.c_str(), &out),
+              s.firmwareEntry() == nullptr ? Code(BrickSession::kNullFirmwarePath) : kUnchecked);
     }
 };
 
