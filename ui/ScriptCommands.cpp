@@ -2,6 +2,7 @@
 // the reports that the library's callbacks post.
 #include "ui/TestClientDialog.h"
 
+#include <algorithm>
 #include <cstdint>
 #include <cstdio>
 
@@ -240,15 +241,22 @@ void TestClientDialog::OnReceive()
 void TestClientDialog::OnDownloadProgress(std::int32_t status, std::int32_t count)
 {
     if (status < 0) {
+        // A failed firmware download has no closing steps: left set, the flag would make the
+        // next ordinary download run them and report itself as firmware.
+        firmwarePending_ = false;
         ShowError(status, nullptr);
         OfferTroubleShooter(status);
         return;
     }
-    if (count != downloadTotal_) {
+    // A count at or beyond the total is the last report, as the routing takes it too: a
+    // library that over-reports still ends the download with its closing steps.
+    if (count < downloadTotal_) {
         // 64 bits, so that a large count cannot overflow; a total of 0 (a later download
-        // found no code while this one ran) must not divide.
+        // found no code while this one ran) must not divide; a negative count shows 0.
         const std::int64_t percent =
-            downloadTotal_ > 0 ? static_cast<std::int64_t>(count) * 100 / downloadTotal_ : 0;
+            downloadTotal_ > 0
+                ? std::max<std::int64_t>(0, std::int64_t{count} * 100 / downloadTotal_)
+                : 0;
         ShowStatusF("Downloading: %d%% done", static_cast<int>(percent));
         return;
     }

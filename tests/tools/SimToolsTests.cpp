@@ -269,6 +269,21 @@ TEST_F(SimFirmware, CorruptedImageFailsWithItsCode)
     EXPECT_EQ(host().FocusedControl(window()), ui::IdEditor);
 }
 
+TEST_F(SimFirmware, ATowerPulledOutAnywhereLeavesNoClosingStepsPending)
+{
+    // Wherever the link breaks, a failed firmware download must not leave its closing steps
+    // for the next ordinary download to run.
+    for (int packet = 1; packet <= 24; ++packet) {
+        SCOPED_TRACE(packet);
+        ASSERT_NO_FATAL_FAILURE(Start(std::string(kFastLink) + "[brick b1]\n[port KIVOTOWER1]\n" +
+                                          "unplug-after = " + std::to_string(packet) + "\n",
+                                      "USB=KIVOTOWER1"));
+        Download("Onyx2firm.kvo");
+        EXPECT_FALSE(dialog().firmwarePending());
+        Stop();
+    }
+}
+
 TEST_F(SimFirmware, WithoutAPortNothingIsSent)
 {
     ASSERT_NO_FATAL_FAILURE(Start(std::string(kFastLink)));
