@@ -25,6 +25,7 @@
 #include <algorithm>
 #include <filesystem>
 #include <fstream>
+#include <map>
 #include <regex>
 #include <sstream>
 #include <string>
@@ -80,8 +81,7 @@ struct Expectations {
     std::vector<std::string> objectLines, listingLines, symbolLines;
     int commands = -1;
     std::vector<std::pair<std::string, int>> vars;
-    bool checkSent = false, checkSounds = false, checkTones = false, checkRequests = false;
-    std::vector<int> sent, sounds, tones, requests;
+    std::map<std::string, std::vector<int>> effects; // sent, sounds, tones, requests
     int brickType = 6;
 };
 
@@ -105,6 +105,7 @@ Expectations Parse(std::string& source)
     static const std::regex kError(
         R"(\s*error\s+(driver\s+|library\s+)?(\d+)\s+at\s+(\d+|"[^"]*")(:\s?(.*))?)");
     static const std::regex kVar(R"(\s*var\s+(\w+)\s*=\s*(-?\d+)\s*)");
+    static const std::regex kEffect(R"(\s*(sent|sounds|tones|requests):(.*))");
     std::size_t pos = 0;
     while (pos < source.size()) {
         std::size_t end = source.find('\n', pos);
@@ -143,18 +144,8 @@ Expectations Parse(std::string& source)
                 e.commands = std::stoi(rest.substr(11));
             } else if (std::smatch vm; std::regex_match(rest, vm, kVar)) {
                 e.vars.emplace_back(vm[1], std::stoi(vm[2]));
-            } else if (rest.rfind(" sent:", 0) == 0) {
-                e.checkSent = true;
-                e.sent = Numbers(rest.substr(6));
-            } else if (rest.rfind(" sounds:", 0) == 0) {
-                e.checkSounds = true;
-                e.sounds = Numbers(rest.substr(8));
-            } else if (rest.rfind(" tones:", 0) == 0) {
-                e.checkTones = true;
-                e.tones = Numbers(rest.substr(7));
-            } else if (rest.rfind(" requests:", 0) == 0) {
-                e.checkRequests = true;
-                e.requests = Numbers(rest.substr(10));
+            } else if (std::smatch fm; std::regex_match(rest, fm, kEffect)) {
+                e.effects[fm[1]] = Numbers(fm[2]);
             } else {
                 ADD_FAILURE() << "unreadable expectation: " << line;
             }
@@ -291,7 +282,7 @@ TEST_P(ScriptFile, MeetsItsExpectations)
         ExpectLines("listing", listing.output, e.listingLines);
     }
 
-    if (e.vars.empty() && !e.checkSent && !e.checkSounds && !e.checkTones && !e.checkRequests) {
+    if (e.vars.empty() && e.effects.empty()) {
         return;
     }
     simlang_test::FakeHost host(&program);
@@ -323,17 +314,12 @@ TEST_P(ScriptFile, MeetsItsExpectations)
         ASSERT_GE(index, 0) << "no variable " << name;
         EXPECT_EQ(host.variables[index], value) << "variable " << name;
     }
-    if (e.checkSent) {
-        EXPECT_EQ(host.messages, e.sent);
-    }
-    if (e.checkSounds) {
-        EXPECT_EQ(host.sounds, e.sounds);
-    }
-    if (e.checkTones) {
-        EXPECT_EQ(host.tones, e.tones);
-    }
-    if (e.checkRequests) {
-        EXPECT_EQ(host.requests, e.requests);
+    const std::map<std::string, std::vector<int>> seen = {{"sent", host.messages},
+                                                          {"sounds", host.sounds},
+                                                          {"tones", host.tones},
+                                                          {"requests", host.requests}};
+    for (const auto& [what, wanted] : e.effects) {
+        EXPECT_EQ(seen.at(what), wanted) << what;
     }
 }
 
