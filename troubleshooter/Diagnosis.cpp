@@ -176,6 +176,25 @@ std::int32_t TroubleShooter::ReopenTail(const char* name, tessel::Short brickTyp
     return LogStep("Set brick type", session_->Set(handle(), tessel::PropBrickType, brickType));
 }
 
+std::int32_t TroubleShooter::ReopenAndCheck(const char* name, tessel::Short brickType)
+{
+    const std::int32_t reopened = ReopenTail(name, brickType);
+    if (reopened < 0) {
+        return reopened;
+    }
+    return PortStatus();
+}
+
+std::int32_t TroubleShooter::InSection(const char* heading, const char* label,
+                                       std::int32_t (TroubleShooter::*steps)())
+{
+    const std::int32_t section = BeginSection(heading);
+    if (section < 0) {
+        return section;
+    }
+    return LogStep(label, (this->*steps)());
+}
+
 std::int32_t TroubleShooter::GetTowerType()
 {
     const std::int32_t section = BeginSection("\nGet Tower Type:\n");
@@ -198,6 +217,11 @@ std::int32_t TroubleShooter::GetTowerType()
 
 std::int32_t TroubleShooter::LocateTower()
 {
+    return LocatePortNamed(nullptr);
+}
+
+std::int32_t TroubleShooter::LocatePortNamed(const char* namePart)
+{
     const tessel::Short brickType = ReopenPreamble();
     char name[kNameSize] = {};
     std::int32_t result = LogStep("Find port", session_->FindPort(name, kNameSize));
@@ -205,11 +229,10 @@ std::int32_t TroubleShooter::LocateTower()
         return result;
     }
     name[kNameSize - 1] = '\0';
-    result = ReopenTail(name, brickType);
-    if (result < 0) {
-        return result;
+    if (namePart != nullptr && std::strstr(name, namePart) == nullptr) {
+        return static_cast<std::int32_t>(kNoMorePorts);
     }
-    result = PortStatus();
+    result = ReopenAndCheck(name, brickType);
     if (result < 0) {
         return result;
     }
@@ -218,34 +241,12 @@ std::int32_t TroubleShooter::LocateTower()
 
 std::int32_t TroubleShooter::FindTower()
 {
-    const std::int32_t section = BeginSection("\nFind Tower:\n");
-    if (section < 0) {
-        return section;
-    }
-    return LogStep("Find tower", LocateTower());
+    return InSection("\nFind Tower:\n", "Find tower", &TroubleShooter::LocateTower);
 }
 
 std::int32_t TroubleShooter::LocateUsbTower()
 {
-    const tessel::Short brickType = ReopenPreamble();
-    char name[kNameSize] = {};
-    std::int32_t result = LogStep("Find port", session_->FindPort(name, kNameSize));
-    if (result < 0) {
-        return result;
-    }
-    name[kNameSize - 1] = '\0';
-    if (std::strstr(name, "KIVOTOWER") == nullptr) {
-        return static_cast<std::int32_t>(kNoMorePorts);
-    }
-    result = ReopenTail(name, brickType);
-    if (result < 0) {
-        return result;
-    }
-    result = PortStatus();
-    if (result < 0) {
-        return result;
-    }
-    return GetTowerType();
+    return LocatePortNamed("KIVOTOWER");
 }
 
 std::int32_t TroubleShooter::FindUsbTower()
@@ -263,11 +264,7 @@ std::int32_t TroubleShooter::FindUsbTower()
         return result;
     }
     name[kNameSize - 1] = '\0';
-    result = ReopenTail(name, brickType);
-    if (result < 0) {
-        return result;
-    }
-    return PortStatus();
+    return ReopenAndCheck(name, brickType);
 }
 
 std::int32_t TroubleShooter::FindComPort()
@@ -330,11 +327,7 @@ std::int32_t TroubleShooter::TestSerialPort(std::int16_t portNumber)
     if (result < 0) {
         return result;
     }
-    result = ReopenTail(listedName, brickType);
-    if (result < 0) {
-        return result;
-    }
-    return PortStatus();
+    return ReopenAndCheck(listedName, brickType);
 }
 
 std::int32_t TroubleShooter::PortStatus()
@@ -357,11 +350,7 @@ std::int32_t TroubleShooter::TestTowerSteps()
 
 std::int32_t TroubleShooter::TestTower()
 {
-    const std::int32_t section = BeginSection("\nTest Tower:\n");
-    if (section < 0) {
-        return section;
-    }
-    return LogStep("Tower", TestTowerSteps());
+    return InSection("\nTest Tower:\n", "Tower", &TroubleShooter::TestTowerSteps);
 }
 
 std::int32_t TroubleShooter::BrickStatus()
@@ -384,11 +373,7 @@ std::int32_t TroubleShooter::TestBrickSteps()
 
 std::int32_t TroubleShooter::TestBrick()
 {
-    const std::int32_t section = BeginSection("\nTest Onyx:\n");
-    if (section < 0) {
-        return section;
-    }
-    return LogStep("Onyx", TestBrickSteps());
+    return InSection("\nTest Onyx:\n", "Onyx", &TroubleShooter::TestBrickSteps);
 }
 
 std::int32_t TroubleShooter::SetUsbRange(std::int16_t range)

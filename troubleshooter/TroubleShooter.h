@@ -97,6 +97,14 @@ private:
     tessel::Short ReopenPreamble();
     // Creates the port and gives it the remembered brick type.
     std::int32_t ReopenTail(const char* name, tessel::Short brickType);
+    // ReopenTail, then the port's status.
+    std::int32_t ReopenAndCheck(const char* name, tessel::Short brickType);
+    // Finds the port, reopens it and asks the tower type; a name lacking namePart (when
+    // given) is no port of the wanted kind.
+    std::int32_t LocatePortNamed(const char* namePart);
+    // Opens the section and logs the steps' outcome under the label.
+    std::int32_t InSection(const char* heading, const char* label,
+                           std::int32_t (TroubleShooter::*steps)());
     std::int32_t PortStateError();
     tessel::Long handle() const { return handleSlot_ != nullptr ? *handleSlot_ : 0; }
 
