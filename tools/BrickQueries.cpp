@@ -156,12 +156,8 @@ tessel::Long BrickQueries::GetTxPower(tessel::Long hBrick, std::uint16_t* value)
         return Argument();
     }
     *value = 0xFFFF;
-    tessel::Long result = 0;
-    tessel::Long status = RunForNumber(hBrick, kGetByteCommand, kTxPowerAddress, &result);
-    if (status >= 0) {
-        *value = static_cast<std::uint16_t>(result);
-    }
-    return status;
+    return RunForWord(hBrick, kGetByteCommand, kTxPowerAddress, value,
+                      [](tessel::Long result) { return result; });
 }
 
 tessel::Long BrickQueries::GetPowerDownTime(tessel::Long hBrick, std::uint16_t* minutes)
@@ -170,12 +166,8 @@ tessel::Long BrickQueries::GetPowerDownTime(tessel::Long hBrick, std::uint16_t* 
         return Argument();
     }
     *minutes = 0;
-    tessel::Long result = 0;
-    tessel::Long status = RunForNumber(hBrick, kGetWordCommand, kPowerDownAddress, &result);
-    if (status >= 0) {
-        *minutes = static_cast<std::uint16_t>(result / 256);
-    }
-    return status;
+    return RunForWord(hBrick, kGetWordCommand, kPowerDownAddress, minutes,
+                      [](tessel::Long result) { return result / 256; });
 }
 
 tessel::Long BrickQueries::GetProgramSlot(tessel::Long hBrick, std::uint16_t* slot)
@@ -184,12 +176,8 @@ tessel::Long BrickQueries::GetProgramSlot(tessel::Long hBrick, std::uint16_t* sl
         return Argument();
     }
     *slot = 0;
-    tessel::Long result = 0;
-    tessel::Long status = RunForNumber(hBrick, kGetByteCommand, kProgramSlotAddress, &result);
-    if (status >= 0) {
-        *slot = static_cast<std::uint16_t>(result + 1);
-    }
-    return status;
+    return RunForWord(hBrick, kGetByteCommand, kProgramSlotAddress, slot,
+                      [](tessel::Long result) { return result + 1; });
 }
 
 tessel::Long BrickQueries::GetTaskByte(tessel::Long hBrick, int slot, int task,
@@ -199,11 +187,19 @@ tessel::Long BrickQueries::GetTaskByte(tessel::Long hBrick, int slot, int task,
         return Argument();
     }
     *value = 0;
-    tessel::Long result = 0;
     auto address = static_cast<std::uint16_t>(kTaskByteBase + 10 * slot + task);
-    tessel::Long status = RunForNumber(hBrick, kGetByteCommand, address, &result);
+    return RunForWord(hBrick, kGetByteCommand, address, value,
+                      [](tessel::Long result) { return result; });
+}
+
+tessel::Long BrickQueries::RunForWord(tessel::Long hBrick, const char* format,
+                                      std::uint16_t address, std::uint16_t* value,
+                                      tessel::Long (*convert)(tessel::Long))
+{
+    tessel::Long result = 0;
+    tessel::Long status = RunForNumber(hBrick, format, address, &result);
     if (status >= 0) {
-        *value = static_cast<std::uint16_t>(result);
+        *value = static_cast<std::uint16_t>(convert(result));
     }
     return status;
 }
@@ -298,34 +294,26 @@ tessel::Long BrickQueries::GetTaskLocation(tessel::Long hBrick, const BrickMemor
                                            tessel::Short slot, tessel::Short task,
                                            std::uint16_t* start, std::uint16_t* size)
 {
-    if (start == nullptr || size == nullptr || !IsTaskArgument(slot, task)) {
-        return Argument();
-    }
-    *start = 0;
-    *size = 0;
-    tessel::Short type = 0;
-    tessel::Long status = BrickType(hBrick, &type);
-    if (status < 0) {
-        return status;
-    }
-    if (type == tessel::BrickRover) {
-        if (slot != 1 || task > kRoverTasks) {
-            return Argument();
-        }
-        return RoverLocation(hBrick, static_cast<std::uint16_t>(kRoverTaskBase + task), start,
-                             size);
-    }
-    int k = BrickMemoryMap::TaskIndex(slot, task);
-    *start = map.words[k];
-    *size = map.SizeAt(k);
-    return 0;
+    static constexpr PartKind kTask = {IsTaskArgument, kRoverTasks, kRoverTaskBase,
+                                       BrickMemoryMap::TaskIndex};
+    return PartLocation(kTask, hBrick, map, slot, task, start, size);
 }
 
 tessel::Long BrickQueries::GetSubLocation(tessel::Long hBrick, const BrickMemoryMap& map,
                                           tessel::Short slot, tessel::Short sub,
                                           std::uint16_t* start, std::uint16_t* size)
 {
-    if (start == nullptr || size == nullptr || !IsSubArgument(slot, sub)) {
+    static constexpr PartKind kSub = {IsSubArgument, kRoverSubs, kRoverSubBase,
+                                      BrickMemoryMap::SubIndex};
+    return PartLocation(kSub, hBrick, map, slot, sub, start, size);
+}
+
+tessel::Long BrickQueries::PartLocation(const PartKind& kind, tessel::Long hBrick,
+                                        const BrickMemoryMap& map, tessel::Short slot,
+                                        tessel::Short number, std::uint16_t* start,
+                                        std::uint16_t* size)
+{
+    if (start == nullptr || size == nullptr || !kind.isArgument(slot, number)) {
         return Argument();
     }
     *start = 0;
@@ -335,13 +323,15 @@ tessel::Long BrickQueries::GetSubLocation(tessel::Long hBrick, const BrickMemory
     if (status < 0) {
         return status;
     }
+    // The rover keeps one slot and lists its parts' locations in a table of its own.
     if (type == tessel::BrickRover) {
-        if (slot != 1 || sub > kRoverSubs) {
+        if (slot != 1 || number > kind.roverCount) {
             return Argument();
         }
-        return RoverLocation(hBrick, static_cast<std::uint16_t>(kRoverSubBase + sub), start, size);
+        return RoverLocation(hBrick, static_cast<std::uint16_t>(kind.roverBase + number), start,
+                             size);
     }
-    int k = BrickMemoryMap::SubIndex(slot, sub);
+    int k = kind.index(slot, number);
     *start = map.words[k];
     *size = map.SizeAt(k);
     return 0;

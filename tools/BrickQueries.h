@@ -81,6 +81,20 @@ private:
     tessel::Long BrickType(tessel::Long hBrick, tessel::Short* type);
     tessel::Long RunForNumber(tessel::Long hBrick, const char* format, std::uint16_t address,
                               tessel::Long* result);
+    // RunForNumber whose answer, converted, lands in *value; *value is left as it was
+    // when the query fails.
+    tessel::Long RunForWord(tessel::Long hBrick, const char* format, std::uint16_t address,
+                            std::uint16_t* value, tessel::Long (*convert)(tessel::Long));
+    // What tells tasks and subroutines apart when locating one.
+    struct PartKind {
+        bool (*isArgument)(int slot, int number);
+        int roverCount;
+        std::uint16_t roverBase;
+        int (*index)(int slot, int number);
+    };
+    tessel::Long PartLocation(const PartKind& kind, tessel::Long hBrick, const BrickMemoryMap& map,
+                              tessel::Short slot, tessel::Short number, std::uint16_t* start,
+                              std::uint16_t* size);
     tessel::Long TranslateAndRun(tessel::Long hBrick, tessel::Short brickType, const char* text,
                                  tessel::Long* result, ReaderWriter** resultFile);
     // ReadMemory of 4 bytes as two little-endian words; false when fewer came back.
