@@ -61,6 +61,31 @@ private:
     IError* sink_;
 };
 
+// Reads the source whole and translates it, includes coming from the client's tree and the
+// failure report going to sink. Returns the code of a failed read, else kOk with the
+// translator's outcome in result.
+Long ReadAndTranslate(ReaderWriter* source, IError* sink, Short brickType, std::int32_t sourceType,
+                      std::int32_t targetType, std::string& text,
+                      tessel::lang::TranslateResult& result)
+{
+    const ReadResult read = Read(source, text);
+    if (read != ReadResult::Ok) {
+        // A source too large to hold is the compiler's "error while reading source file".
+        return read == ReadResult::TooLarge ? Compiler(152) : kBadSource;
+    }
+    WorkspaceIncludes includes(source);
+    SinkDiagnostics diagnostics(sink);
+    tessel::lang::TranslateRequest request;
+    request.brickType = brickType;
+    request.sourceType = sourceType;
+    request.targetType = targetType;
+    request.source = text;
+    request.includes = &includes;
+    request.diagnostics = &diagnostics;
+    result = tessel::lang::Translator().translate(request);
+    return kOk;
+}
+
 } // namespace
 
 Long Library::validate(Short brickType, ReaderWriter* source, IError* sink, ReaderWriter* extra1,
@@ -74,21 +99,12 @@ Long Library::validate(Short brickType, ReaderWriter* source, IError* sink, Read
         return kBadSourceType;
     }
     std::string text;
-    const ReadResult read = Read(source, text);
-    if (read != ReadResult::Ok) {
-        // A source too large to hold is the compiler's "error while reading source file".
-        return read == ReadResult::TooLarge ? Compiler(152) : kBadSource;
+    tessel::lang::TranslateResult result;
+    const Long read =
+        ReadAndTranslate(source, sink, brickType, type, tessel::lang::TargetObject, text, result);
+    if (read != kOk) {
+        return read;
     }
-    WorkspaceIncludes includes(source);
-    SinkDiagnostics diagnostics(sink);
-    tessel::lang::TranslateRequest request;
-    request.brickType = brickType;
-    request.sourceType = type;
-    request.targetType = tessel::lang::TargetObject;
-    request.source = text;
-    request.includes = &includes;
-    request.diagnostics = &diagnostics;
-    const tessel::lang::TranslateResult result = tessel::lang::Translator().translate(request);
     trace_.line("tslValidate(%d, type %d) -> 0x%x", brickType, type,
                 static_cast<unsigned>(result.code));
     return result.code;
@@ -109,21 +125,12 @@ Long Library::translate(Short brickType, ReaderWriter* source, ReaderWriter* tar
         return kBadTargetType;
     }
     std::string text;
-    const ReadResult read = Read(source, text);
-    if (read != ReadResult::Ok) {
-        // A source too large to hold is the compiler's "error while reading source file".
-        return read == ReadResult::TooLarge ? Compiler(152) : kBadSource;
+    tessel::lang::TranslateResult result;
+    const Long read =
+        ReadAndTranslate(source, sink, brickType, sourceType, targetType, text, result);
+    if (read != kOk) {
+        return read;
     }
-    WorkspaceIncludes includes(source);
-    SinkDiagnostics diagnostics(sink);
-    tessel::lang::TranslateRequest request;
-    request.brickType = brickType;
-    request.sourceType = sourceType;
-    request.targetType = targetType;
-    request.source = text;
-    request.includes = &includes;
-    request.diagnostics = &diagnostics;
-    const tessel::lang::TranslateResult result = tessel::lang::Translator().translate(request);
     trace_.line("tslTranslate(%d, type %d -> %d, %zu bytes) -> 0x%x", brickType, sourceType,
                 targetType, text.size(), static_cast<unsigned>(result.code));
     if (result.code < 0) {
