@@ -36,23 +36,30 @@ void TestClientDialog::OnFileNew()
     UpdateTitle();
 }
 
-void TestClientDialog::OnFileOpen()
+bool TestClientDialog::ChooseScriptFile(bool save, char* path, std::uint32_t size)
 {
-    char path[kChoiceSize];
-    std::snprintf(path, sizeof path, "%s", kDefaultPattern);
     FileDialogRequest request;
     request.owner = handle();
     request.filters = kScriptFilters;
     request.filterCount = kScriptFilterCount;
     request.path = path;
-    request.size = sizeof path;
-    if (!host_.ChooseOpenFile(request))
-        return;
-    path[sizeof path - 1] = '\0';
+    request.size = size;
+    if (!(save ? host_.ChooseSaveFile(request) : host_.ChooseOpenFile(request)))
+        return false;
+    path[size - 1] = '\0';
     if (std::strlen(path) >= kPathSize) {
         ShowFailureF("File name too long: %s", path);
-        return;
+        return false;
     }
+    return true;
+}
+
+void TestClientDialog::OnFileOpen()
+{
+    char path[kChoiceSize];
+    std::snprintf(path, sizeof path, "%s", kDefaultPattern);
+    if (!ChooseScriptFile(false, path, sizeof path))
+        return;
     if (LoadScriptFile(path))
         SetCurrentFile(path);
     UpdateTitle();
@@ -75,19 +82,8 @@ void TestClientDialog::OnFileSaveAs()
     char path[kChoiceSize];
     std::snprintf(path, sizeof path, "%s",
                   currentFile_[0] != '\0' ? currentFile_ : kDefaultPattern);
-    FileDialogRequest request;
-    request.owner = handle();
-    request.filters = kScriptFilters;
-    request.filterCount = kScriptFilterCount;
-    request.path = path;
-    request.size = sizeof path;
-    if (!host_.ChooseSaveFile(request))
+    if (!ChooseScriptFile(true, path, sizeof path))
         return;
-    path[sizeof path - 1] = '\0';
-    if (std::strlen(path) >= kPathSize) {
-        ShowFailureF("File name too long: %s", path);
-        return;
-    }
     // An existing file is overwritten without a question; the name is taken as typed.
     WriteEditorFile(path);
     UpdateTitle();

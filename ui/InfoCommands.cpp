@@ -14,14 +14,8 @@ namespace ui {
 
 void TestClientDialog::OnInfo()
 {
-    if (brickHandle_ == 0) {
-        ShowFailure("Port not open");
+    if (!PortAndLibraryReady())
         return;
-    }
-    if (session_ == nullptr) {
-        ShowError(static_cast<std::int32_t>(tessel::kLinkFailed), nullptr);
-        return;
-    }
     tools::SessionBrickAccess access(*session_);
     tools::BrickQueries queries(access);
     // The report's 8 KB buffer lives on the heap rather than the handler's stack.

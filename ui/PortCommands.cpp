@@ -222,10 +222,8 @@ void TestClientDialog::OnTest()
 
 void TestClientDialog::OnStatistics()
 {
-    if (brickHandle_ == 0 || session_ == nullptr) {
-        ShowFailure("Port not open");
+    if (!PortReady())
         return;
-    }
     char text[kStatusSize] = {};
     tessel::Short value = 0;
     if (session_->Get(brickHandle_, tessel::PropStatistics, &value, text, sizeof text) < 0) {

@@ -21,6 +21,73 @@ constexpr const char* kStartCommand = "start main";
 
 } // namespace
 
+bool TestClientDialog::PortReady()
+{
+    if (brickHandle_ == 0 || session_ == nullptr) {
+        ShowFailure("Port not open");
+        return false;
+    }
+    return true;
+}
+
+bool TestClientDialog::PortAndLibraryReady()
+{
+    if (brickHandle_ == 0) {
+        ShowFailure("Port not open");
+        return false;
+    }
+    if (session_ == nullptr) {
+        ShowError(static_cast<std::int32_t>(tessel::kLinkFailed), nullptr);
+        return false;
+    }
+    return true;
+}
+
+bool TestClientDialog::AutoClear(tessel::Short brickType)
+{
+    if (!host_.IsChecked(handle(), IdAutoClear))
+        return true;
+    const tessel::Long cleared = RunCommand(kClearCommand, brickType);
+    if (cleared < 0) {
+        ShowError(cleared, nullptr);
+        OfferTroubleShooter(cleared);
+        return false;
+    }
+    return true;
+}
+
+ReaderWriter* TestClientDialog::TranslateEditorForRun(bool offerTroubleShooter)
+{
+    if (!PortReady())
+        return nullptr;
+    ClearStatus();
+    const tessel::Short brickType = SelectedBrickType();
+    const std::unique_ptr<char[]> text = ReadEditorText();
+    if (!text || text[0] == '\0')
+        return nullptr;
+    const std::int32_t sourceType = SelectedSourceType();
+
+    ErrorSink sink;
+    ReaderWriter* object = nullptr;
+    const tessel::Long code = session_->TranslateText(brickType, sourceType, text.get(), &object,
+                                                      &sink, nullptr, nullptr);
+    if (code < 0) {
+        BrickSession::ReleaseReaderWriter(&object);
+        PlaceEditorCaret(sink.GetPosition());
+        ShowError(code, &sink);
+        if (offerTroubleShooter)
+            OfferTroubleShooter(code);
+        FocusEditor();
+        return nullptr;
+    }
+    if (BrickSession::ContentSize(object) == 0) {
+        BrickSession::ReleaseReaderWriter(&object);
+        ShowFailure("No code");
+        return nullptr;
+    }
+    return object;
+}
+
 void TestClientDialog::OnValidate()
 {
     if (host_.ListSelection(handle(), IdSourceList) == SourceListOpal) {
@@ -49,38 +116,14 @@ void TestClientDialog::OnValidate()
 
 void TestClientDialog::OnExecute()
 {
-    if (brickHandle_ == 0 || session_ == nullptr) {
-        ShowFailure("Port not open");
+    ReaderWriter* object = TranslateEditorForRun(true);
+    if (object == nullptr)
         return;
-    }
-    ClearStatus();
-    const tessel::Short brickType = SelectedBrickType();
-    const std::unique_ptr<char[]> text = ReadEditorText();
-    if (!text || text[0] == '\0')
-        return;
-    const std::int32_t sourceType = SelectedSourceType();
-
-    ErrorSink sink;
-    ReaderWriter* object = nullptr;
-    tessel::Long code = session_->TranslateText(brickType, sourceType, text.get(), &object, &sink,
-                                                nullptr, nullptr);
-    if (code < 0) {
-        BrickSession::ReleaseReaderWriter(&object);
-        PlaceEditorCaret(sink.GetPosition());
-        ShowError(code, &sink);
-        OfferTroubleShooter(code);
-        FocusEditor();
-        return;
-    }
-    if (BrickSession::ContentSize(object) == 0) {
-        BrickSession::ReleaseReaderWriter(&object);
-        ShowFailure("No code");
-        return;
-    }
 
     tessel::Long result = 0;
     ReaderWriter* resultFile = nullptr;
-    code = session_->ExecCode(brickHandle_, object, &result, &resultFile, nullptr, nullptr);
+    const tessel::Long code =
+        session_->ExecCode(brickHandle_, object, &result, &resultFile, nullptr, nullptr);
     BrickSession::ReleaseReaderWriter(&object);
 
     // Both files go back before the offer: a Trouble Shooter run pumps messages, and the
@@ -102,37 +145,13 @@ void TestClientDialog::OnExecute()
 
 void TestClientDialog::OnExecuteAsync()
 {
-    if (brickHandle_ == 0 || session_ == nullptr) {
-        ShowFailure("Port not open");
+    ReaderWriter* object = TranslateEditorForRun(false);
+    if (object == nullptr)
         return;
-    }
-    ClearStatus();
-    const tessel::Short brickType = SelectedBrickType();
-    const std::unique_ptr<char[]> text = ReadEditorText();
-    if (!text || text[0] == '\0')
-        return;
-    const std::int32_t sourceType = SelectedSourceType();
-
-    ErrorSink sink;
-    ReaderWriter* object = nullptr;
-    tessel::Long code = session_->TranslateText(brickType, sourceType, text.get(), &object, &sink,
-                                                nullptr, nullptr);
-    if (code < 0) {
-        BrickSession::ReleaseReaderWriter(&object);
-        PlaceEditorCaret(sink.GetPosition());
-        ShowError(code, &sink);
-        FocusEditor();
-        return;
-    }
-    if (BrickSession::ContentSize(object) == 0) {
-        BrickSession::ReleaseReaderWriter(&object);
-        ShowFailure("No code");
-        return;
-    }
 
     // The result arrives as WM_USER+3. A call refused outright never reports back, so its
     // refusal is shown here; otherwise the user would be left with an empty status box.
-    code = StartAsyncExec(object);
+    const tessel::Long code = StartAsyncExec(object);
     BrickSession::ReleaseReaderWriter(&object);
     if (code < 0)
         ShowError(code, nullptr);
@@ -141,10 +160,8 @@ void TestClientDialog::OnExecuteAsync()
 
 void TestClientDialog::OnDownload()
 {
-    if (brickHandle_ == 0 || session_ == nullptr) {
-        ShowFailure("Port not open");
+    if (!PortReady())
         return;
-    }
     ClearStatus();
     const std::unique_ptr<char[]> text = ReadEditorText();
     if (!text || text[0] == '\0')
@@ -156,14 +173,8 @@ void TestClientDialog::OnDownload()
     // start the next stress iteration.
     stressIteration_ = 0;
 
-    if (host_.IsChecked(handle(), IdAutoClear)) {
-        const tessel::Long cleared = RunCommand(kClearCommand, brickType);
-        if (cleared < 0) {
-            ShowError(cleared, nullptr);
-            OfferTroubleShooter(cleared);
-            return;
-        }
-    }
+    if (!AutoClear(brickType))
+        return;
 
     ErrorSink sink;
     ReaderWriter* object = nullptr;
@@ -183,24 +194,16 @@ void TestClientDialog::OnDownload()
 
 void TestClientDialog::OnDownloadFile()
 {
-    if (brickHandle_ == 0 || session_ == nullptr) {
-        ShowFailure("Port not open");
+    if (!PortReady())
         return;
-    }
     char fileName[kPathSize] = {};
     host_.GetControlText(handle(), IdDownloadFileName, fileName, sizeof fileName);
     const tessel::Short brickType = SelectedBrickType();
 
     stressIteration_ = 0;
 
-    if (host_.IsChecked(handle(), IdAutoClear)) {
-        const tessel::Long cleared = RunCommand(kClearCommand, brickType);
-        if (cleared < 0) {
-            ShowError(cleared, nullptr);
-            OfferTroubleShooter(cleared);
-            return;
-        }
-    }
+    if (!AutoClear(brickType))
+        return;
 
     // A file is either a script or assembler source; no selection counts as Script.
     const int selected = host_.ListSelection(handle(), IdSourceList);

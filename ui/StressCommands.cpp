@@ -47,10 +47,8 @@ const tessel::Long kNoLibrary = static_cast<tessel::Long>(tessel::kLinkFailed);
 
 void TestClientDialog::OnStress()
 {
-    if (brickHandle_ == 0 || session_ == nullptr) {
-        ShowFailure("Port not open");
+    if (!PortReady())
         return;
-    }
     ClearStatus();
     stressIteration_ = 1;
     StressStep();

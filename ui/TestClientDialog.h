@@ -194,6 +194,9 @@ public:
     // Reads the file whole into the editor; false, changing nothing, when it cannot be
     // opened or read. currentFile is left alone.
     bool LoadScriptFile(const char* path);
+    // Asks for a script file to open or to save into path (size bytes, holding the name to
+    // offer); false when the user cancelled or the name does not fit a path.
+    bool ChooseScriptFile(bool save, char* path, std::uint32_t size);
     // Translates text as a Script for brickType and executes it on brickHandle.
     tessel::Long RunCommand(const char* text, tessel::Short brickType);
     // The whole content of file as a terminated text; null for a null file, a failed open
@@ -206,6 +209,17 @@ public:
     // number lives in the dialog, since the library may write it after this returns. Returns
     // the call's result. The object stays the caller's.
     tessel::Long StartAsyncExec(ReaderWriter* object);
+    // False, showing "Port not open", when no port is open or no library is loaded.
+    bool PortReady();
+    // The same test told apart: no port shows "Port not open", no library the link failure.
+    bool PortAndLibraryReady();
+    // Clears the brick's tasks and subroutines when Auto Clear is checked; false, with the
+    // failure shown and the Trouble Shooter offered, when clearing failed.
+    bool AutoClear(tessel::Short brickType);
+    // The editor's text translated for the open port, the caller's to release. Null when no
+    // port is open, the editor is empty, translation failed (shown, the caret placed at the
+    // error) or it produced no code ("No code").
+    ReaderWriter* TranslateEditorForRun(bool offerTroubleShooter);
 
     // Status box (1003): one message at a time, each replacing the last.
     void ShowStatus(const char* text);

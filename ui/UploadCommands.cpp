@@ -11,14 +11,8 @@ namespace ui {
 
 void TestClientDialog::OnUpload()
 {
-    if (brickHandle_ == 0) {
-        ShowFailure("Port not open");
+    if (!PortAndLibraryReady())
         return;
-    }
-    if (session_ == nullptr) {
-        ShowError(static_cast<std::int32_t>(tessel::kLinkFailed), nullptr);
-        return;
-    }
     tools::SessionBrickAccess access(*session_);
     tools::BrickQueries queries(access);
     tools::ProgramUpload upload(queries);
