@@ -112,7 +112,7 @@ constexpr char kSerialBench[] = "[brick onyx2]\n[port COM1]\n[port COM3]\n";
 
 // A yes to the offer: the topics the run showed as the help's links were followed, and a part
 // of the log it left.
-struct Run {
+struct HelpRun {
     const char* name;
     const char* scenario;
     std::uint32_t error; // below 100: a status offered with its text
@@ -121,11 +121,12 @@ struct Run {
     const char* logged;
 };
 
-class TroubleShooterRuns : public TroubleShooterOffers, public testing::WithParamInterface<Run> {};
+class TroubleShooterRuns : public TroubleShooterOffers,
+                           public testing::WithParamInterface<HelpRun> {};
 
 TEST_P(TroubleShooterRuns, ShowTheTopicsOfTheLinksFollowedAndEndCleanly)
 {
-    const Run& run = GetParam();
+    const HelpRun& run = GetParam();
     StartDialog(run.scenario, "Serial=COM1");
     links = run.links;
     host_->QueueAnswer(true);
@@ -144,45 +145,46 @@ TEST_P(TroubleShooterRuns, ShowTheTopicsOfTheLinksFollowedAndEndCleanly)
 INSTANTIATE_TEST_SUITE_P(
     Offers, TroubleShooterRuns,
     testing::Values(
-        Run{"NoTowerOpensItsTopic",
+        HelpRun{
+            "NoTowerOpensItsTopic",
             kSerialBench,
             0xE0050421u,
             {},
             {"IR_Transmitter_or_cable_not_connected"},
             "\tDiagnosing Error failed:\n\t\tError (0xe0050421) from Tessel driver: "
             "IDSTATUS_RESULT_NOTOWER\n\nGet Tower Type:\n\tGet port name ok\n\tPort 1 is COM1\n"},
-        Run{"StatusIsConvertedBeforeTheDiagnosis",
-            "[brick onyx2]\nalive = no\n[port COM1]\n",
-            6,
-            {},
-            {"Onyx_not_alive"},
-            "\tDiagnosing Error failed:\n"},
-        Run{"TestComPortThreeFindsTheTower",
-            kSerialBench,
-            0xE0050421u,
-            {{2004, 3}, {2000, 0}},
-            {"IR_Transmitter_or_cable_not_connected", "Found_working_IR_Transmitter"},
-            "\nTest serial tower:\n\tTest COM port COM3: ok\n\tCreate port COM3 ok\n"},
-        Run{"PortTypeCommandTurnsNoMoreItemsIntoAUsbFault",
-            "[brick onyx2]\n[port COM1]\nstate = in-use\n",
-            0xE0050421u,
-            {{2007, 0}, {3001, 3}, {2007, 0}, {2000, 0}},
-            {"IR_Transmitter_or_cable_not_connected", "IR_Transmitter_or_cable_not_connected",
-             "USB_Transmitter_not_installed"},
-            "\tEnum COM ports failed:\n"},
-        Run{"EndOfTheHelpInputClosesTheHelp",
-            kSerialBench,
-            0xE0050402u,
-            {{2002, 0}, {2003, 0}},
-            {"Onyx_not_alive", "IR_Transmitter_ok", "Onyx_ok"},
-            "\nTest Onyx:\n"},
-        Run{"ASecondRunTakesTheHelpOverAndBothEnd",
-            kSerialBench,
-            0xE0050421u,
-            {{kNestedRun, Packed(0xE0050402u)}, {2003, 0}, {2000, 0}},
-            {"IR_Transmitter_or_cable_not_connected", "Onyx_not_alive", "Onyx_ok"},
-            "\tOnyx ok\n"}),
-    [](const testing::TestParamInfo<Run>& info) { return std::string(info.param.name); });
+        HelpRun{"StatusIsConvertedBeforeTheDiagnosis",
+                "[brick onyx2]\nalive = no\n[port COM1]\n",
+                6,
+                {},
+                {"Onyx_not_alive"},
+                "\tDiagnosing Error failed:\n"},
+        HelpRun{"TestComPortThreeFindsTheTower",
+                kSerialBench,
+                0xE0050421u,
+                {{2004, 3}, {2000, 0}},
+                {"IR_Transmitter_or_cable_not_connected", "Found_working_IR_Transmitter"},
+                "\nTest serial tower:\n\tTest COM port COM3: ok\n\tCreate port COM3 ok\n"},
+        HelpRun{"PortTypeCommandTurnsNoMoreItemsIntoAUsbFault",
+                "[brick onyx2]\n[port COM1]\nstate = in-use\n",
+                0xE0050421u,
+                {{2007, 0}, {3001, 3}, {2007, 0}, {2000, 0}},
+                {"IR_Transmitter_or_cable_not_connected", "IR_Transmitter_or_cable_not_connected",
+                 "USB_Transmitter_not_installed"},
+                "\tEnum COM ports failed:\n"},
+        HelpRun{"EndOfTheHelpInputClosesTheHelp",
+                kSerialBench,
+                0xE0050402u,
+                {{2002, 0}, {2003, 0}},
+                {"Onyx_not_alive", "IR_Transmitter_ok", "Onyx_ok"},
+                "\nTest Onyx:\n"},
+        HelpRun{"ASecondRunTakesTheHelpOverAndBothEnd",
+                kSerialBench,
+                0xE0050421u,
+                {{kNestedRun, Packed(0xE0050402u)}, {2003, 0}, {2000, 0}},
+                {"IR_Transmitter_or_cable_not_connected", "Onyx_not_alive", "Onyx_ok"},
+                "\tOnyx ok\n"}),
+    [](const testing::TestParamInfo<HelpRun>& info) { return std::string(info.param.name); });
 
 TEST_F(TroubleShooterOffers, NoToEitherQuestionLeavesTheLogUntouched)
 {
