@@ -191,24 +191,10 @@ Long BrickSession::CompileFirmware(const char* hostPath, ReaderWriter** code)
     if (image == nullptr) {
         return Code(kCreateFailed);
     }
-    ReaderWriter* target = firmwareEntry_->open(tessel::FileCode);
-    if (target == nullptr) {
-        ReleaseReaderWriter(&image);
-        return Code(kCreateFailed);
-    }
     // The library may report into a sink; nobody reads this one.
     ErrorSink sink;
-    const Long result = Translate(kImmediateBrickType, image, target, &sink, nullptr, nullptr);
-    ReleaseReaderWriter(&image);
-    if (result < 0) {
-        ReleaseReaderWriter(&target);
-    }
-    if (code != nullptr) {
-        *code = target;
-    } else {
-        ReleaseReaderWriter(&target);
-    }
-    return result;
+    return translateInto(kImmediateBrickType, image, tessel::FileCode, firmwareEntry_, code, &sink,
+                         nullptr, nullptr);
 }
 
 Long BrickSession::ExecCode(Long hBrick, ReaderWriter* code, Long* result,
