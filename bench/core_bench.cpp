@@ -333,7 +333,7 @@ BENCHMARK(BM_FindPathBaselineMap);
 BENCHMARK(BM_FindPath);
 BENCHMARK(BM_Translate10kLinesBaselineRead)->Unit(benchmark::kMillisecond);
 BENCHMARK(BM_Translate10kLines)->Unit(benchmark::kMillisecond);
-BENCHMARK(BM_StressBaselineDirect)->Unit(benchmark::kMillisecond)->Iterations(10);
-BENCHMARK(BM_StressHeadless)->Unit(benchmark::kMillisecond)->Iterations(10);
+BENCHMARK(BM_StressBaselineDirect)->Unit(benchmark::kMillisecond)->Iterations(20);
+BENCHMARK(BM_StressHeadless)->Unit(benchmark::kMillisecond)->Iterations(20);
 
 BENCHMARK_MAIN();
