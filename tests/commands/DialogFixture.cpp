@@ -97,36 +97,6 @@ void DialogFixture::Stop(bool settle)
     host_.reset();
 }
 
-void DialogFixture::Click(int id)
-{
-    ASSERT_TRUE(host_->Click(window(), id)) << "control " << id << " is disabled";
-}
-
-void DialogFixture::SetText(int id, const std::string& text)
-{
-    host_->SetControlText(window(), id, text.c_str());
-}
-
-std::string DialogFixture::Text(int id)
-{
-    return host_->ControlText(window(), id);
-}
-
-void DialogFixture::SelectSource(int index)
-{
-    host_->ListSelect(window(), ui::IdSourceList, index);
-}
-
-void DialogFixture::SelectBrick(int index)
-{
-    host_->ListSelect(window(), ui::IdBrickList, index);
-}
-
-void DialogFixture::SetChecked(int id, bool checked)
-{
-    host_->SetCheck(window(), id, checked);
-}
-
 void DialogFixture::Settle()
 {
     for (;;) {
@@ -161,10 +131,8 @@ void DialogFixture::WaitForStatuses(std::size_t count, bool (*accept)(const std:
 std::vector<std::string> DialogFixture::Statuses() const
 {
     std::vector<std::string> texts;
-    for (const ui::HeadlessEvent& event : events_) {
-        if (event.kind == ui::HeadlessEvent::Kind::Status)
-            texts.push_back(event.text);
-    }
+    for (const ui::HeadlessEvent& event : EventsOf(ui::HeadlessEvent::Kind::Status))
+        texts.push_back(event.text);
     return texts;
 }
 

@@ -46,12 +46,18 @@ protected:
     const std::filesystem::path& dir() const { return dir_; }
 
     // A click as the user makes it; fails the test when the control is disabled.
-    void Click(int id);
-    void SetText(int id, const std::string& text);
-    std::string Text(int id);
-    void SelectSource(int index);
-    void SelectBrick(int index);
-    void SetChecked(int id, bool checked);
+    void Click(int id)
+    {
+        ASSERT_TRUE(host_->Click(window(), id)) << "control " << id << " is disabled";
+    }
+    void SetText(int id, const std::string& text)
+    {
+        host_->SetControlText(window(), id, text.c_str());
+    }
+    std::string Text(int id) { return host_->ControlText(window(), id); }
+    void SelectSource(int index) { host_->ListSelect(window(), ui::IdSourceList, index); }
+    void SelectBrick(int index) { host_->ListSelect(window(), ui::IdBrickList, index); }
+    void SetChecked(int id, bool checked) { host_->SetCheck(window(), id, checked); }
 
     // Handles posted reports until no download or execution is in flight and nothing is
     // queued. Fails the test when a report does not arrive within a generous bound (a hang).

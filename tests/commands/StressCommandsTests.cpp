@@ -10,83 +10,29 @@ namespace commands_test {
 namespace {
 
 using ui::HeadlessEvent;
-
-class StressCommands : public DialogFixture {
-protected:
-    void StartOpen()
-    {
-        ASSERT_NO_FATAL_FAILURE(
-            Start(std::string(kFastLink) + "[brick b1]\n[port COM1]\n", "Serial=COM1"));
-        ASSERT_NE(dialog().brickHandle(), 0);
-        ClearEvents();
-    }
-};
-
-TEST_F(StressCommands, WithoutAPortSaysPortNotOpen)
-{
-    ASSERT_NO_FATAL_FAILURE(Start(std::string(kFastLink) + "[brick b1]\n[port COM1]\n"));
-    Click(ui::IdStress);
-    EXPECT_EQ(LastStatus(), "Port not open");
-    EXPECT_EQ(dialog().stressIteration(), 0);
-}
-
-TEST_F(StressCommands, StartsWithOneHundredIterations)
-{
-    ASSERT_NO_FATAL_FAILURE(StartOpen());
-    EXPECT_EQ(Text(ui::IdStressCount), "100");
-}
-
-TEST_F(StressCommands, ZeroIterationsPassAtOnceWithoutADownload)
-{
-    ASSERT_NO_FATAL_FAILURE(StartOpen());
-    SetText(ui::IdEditor, "task main {");
-    SetText(ui::IdStressCount, "0");
-    Click(ui::IdStress);
-    Settle();
-    EXPECT_EQ(Statuses(), (std::vector<std::string>{"", "Stress test passed ok"}));
-    EXPECT_EQ(dialog().stressIteration(), 0);
-}
-
-TEST_F(StressCommands, ACountThatIsNotANumberCountsAsZero)
-{
-    ASSERT_NO_FATAL_FAILURE(StartOpen());
-    SetText(ui::IdEditor, "task main {");
-    for (const char* count : {"", "abc", "12abc", "99999999999"}) {
-        ClearEvents();
-        SetText(ui::IdStressCount, count);
-        Click(ui::IdStress);
-        Settle();
-        EXPECT_EQ(LastStatus(), "Stress test passed ok") << "count \"" << count << "\"";
-    }
-}
-
-TEST_F(StressCommands, AnIterationThatDoesNotTranslateEndsTheTest)
-{
-    ASSERT_NO_FATAL_FAILURE(StartOpen());
-    SetText(ui::IdEditor, "this is } not { a script");
-    SetText(ui::IdStressCount, "3");
-    Click(ui::IdStress);
-    Settle();
-
-    const std::string shown = LastStatus();
-    EXPECT_EQ(shown.rfind("Stress Script2SplitByteCode() failed on iteration 1, 0xe005", 0), 0u)
-        << shown;
-    EXPECT_EQ(dialog().stressIteration(), 0);
-    EXPECT_TRUE(Offers().empty());
-}
-
-TEST_F(StressCommands, AnEmptyEditorStopsTheStepAndKeepsTheIteration)
-{
-    ASSERT_NO_FATAL_FAILURE(StartOpen());
-    SetText(ui::IdEditor, "");
-    Click(ui::IdStress);
-    Settle();
-    EXPECT_EQ(Statuses(), std::vector<std::string>{""});
-    EXPECT_EQ(dialog().stressIteration(), 1);
-}
+using Texts = std::vector<std::string>;
 
 // A program written without its final closing brace, as the stress test expects it.
 constexpr const char* kOpenProgram = "program S {\n    main {\n        sound 4\n    }\n";
+
+class StressCommands : public DialogFixture {
+protected:
+    void StartOpen(const std::string& brickLines = "")
+    {
+        ASSERT_NO_FATAL_FAILURE(Start(
+            std::string(kFastLink) + "[brick b1]\n" + brickLines + "[port COM1]\n", "Serial=COM1"));
+        ASSERT_NE(dialog().brickHandle(), 0);
+        ClearEvents();
+    }
+    void Stress(const std::string& editor, const std::string& count)
+    {
+        SetText(ui::IdEditor, editor);
+        SetText(ui::IdStressCount, count);
+        ClearEvents();
+        Click(ui::IdStress);
+        Settle();
+    }
+};
 
 // The source working file as the library last read it.
 std::string SourceFileText(ui::TestClientDialog& dialog)
@@ -107,8 +53,7 @@ std::string SourceFileText(ui::TestClientDialog& dialog)
 TEST_F(StressCommands, ThreeIterationsCarryOneMoreSpaceEachAndThenPass)
 {
     ASSERT_NO_FATAL_FAILURE(StartOpen());
-    SetText(ui::IdEditor, kOpenProgram);
-    SetText(ui::IdStressCount, "3");
+    EXPECT_EQ(Text(ui::IdStressCount), "100");
     // When an iteration is announced, its text has just been translated.
     std::vector<std::string> sent;
     ui::TestClientDialog* target = &dialog();
@@ -116,23 +61,20 @@ TEST_F(StressCommands, ThreeIterationsCarryOneMoreSpaceEachAndThenPass)
         if (event.kind == HeadlessEvent::Kind::Status && event.text.rfind("Stress test #", 0) == 0)
             sent.push_back(SourceFileText(*target));
     });
-    Click(ui::IdStress);
-    Settle();
+    Stress(kOpenProgram, "3");
     OnEvent(nullptr);
 
     ASSERT_EQ(sent.size(), 3u);
-    for (std::size_t i = 0; i < sent.size(); ++i) {
+    for (std::size_t i = 0; i < sent.size(); ++i)
         EXPECT_EQ(sent[i], kOpenProgram + std::string(201 + i, ' ') + "}") << "iteration " << i + 1;
-    }
     EXPECT_EQ(Statuses(),
-              (std::vector<std::string>{"", "Downloading", "Stress test #1", "Downloaded ok (0 mS)",
-                                        "Downloading", "Stress test #2", "Downloaded ok (0 mS)",
-                                        "Downloading", "Stress test #3", "Downloaded ok (0 mS)",
-                                        "Stress test passed ok"}));
+              (Texts{"", "Downloading", "Stress test #1", "Downloaded ok (0 mS)", "Downloading",
+                     "Stress test #2", "Downloaded ok (0 mS)", "Downloading", "Stress test #3",
+                     "Downloaded ok (0 mS)", "Stress test passed ok"}));
     EXPECT_EQ(dialog().stressIteration(), 0);
 }
 
-TEST_F(StressCommands, TheCountIsReadAgainAtEveryStep)
+TEST_F(StressCommands, TheCountIsReadAgainAtEveryStepAndNonNumbersCountAsZero)
 {
     ASSERT_NO_FATAL_FAILURE(StartOpen());
     SetText(ui::IdEditor, kOpenProgram);
@@ -145,22 +87,36 @@ TEST_F(StressCommands, TheCountIsReadAgainAtEveryStep)
     for (const std::string& text : Statuses())
         announced += text.rfind("Stress test #", 0) == 0 ? 1 : 0;
     EXPECT_EQ(announced, 2u);
+
+    // Zero iterations pass at once, without even translating.
+    for (const char* count : {"0", "", "abc", "12abc", "99999999999"}) {
+        Stress("task main {", count);
+        EXPECT_EQ(Statuses(), (Texts{"", "Stress test passed ok"})) << "count \"" << count << "\"";
+        EXPECT_EQ(dialog().stressIteration(), 0);
+    }
 }
 
-TEST_F(StressCommands, ADownloadThatCannotStartEndsTheTestAndKeepsItsReason)
+TEST_F(StressCommands, AStepThatCannotGoOnEndsOrKeepsTheIteration)
 {
-    // Program memory too small for any program.
-    ASSERT_NO_FATAL_FAILURE(
-        Start(std::string(kFastLink) + "[brick b1]\nmemory = 0\n[port COM1]\n", "Serial=COM1"));
-    ClearEvents();
-    SetText(ui::IdEditor, kOpenProgram);
-    Click(ui::IdStress);
-    Settle();
+    ASSERT_NO_FATAL_FAILURE(StartOpen());
+    Stress("this is } not { a script", "3");
+    EXPECT_EQ(LastStatus().rfind("Stress Script2SplitByteCode() failed on iteration 1, 0xe005", 0),
+              0u)
+        << LastStatus();
+    EXPECT_EQ(dialog().stressIteration(), 0);
+    EXPECT_TRUE(Offers().empty());
 
-    const std::string full =
-        "Error (0xe005040e) from Tessel driver: not enough memory for task/sub";
-    EXPECT_EQ(LastStatus(), full);
-    EXPECT_EQ(Offers(), std::vector<std::string>{full + ".\r\nUse Trouble Shooter?"});
+    Stress("", "3"); // an empty editor stops the step but keeps the iteration
+    EXPECT_EQ(Statuses(), Texts{""});
+    EXPECT_EQ(dialog().stressIteration(), 1);
+    Stop();
+
+    // Program memory too small for any program: the download does not start.
+    ASSERT_NO_FATAL_FAILURE(StartOpen("memory = 0\n"));
+    Stress(kOpenProgram, "3");
+    EXPECT_EQ(LastStatus(),
+              "Error (0xe005040e) from Tessel driver: not enough memory for task/sub");
+    EXPECT_EQ(Offers().size(), 1u);
     EXPECT_EQ(dialog().stressIteration(), 0);
 }
 
@@ -170,12 +126,9 @@ TEST_F(StressCommands, ADownloadThatBreaksOffStallsTheTestUntilTheUserDownloads)
         Start(std::string(kFastLink) + "[brick b1]\n[port KIVOTOWER1]\nunplug-after = 3\n",
               "USB=KIVOTOWER1"));
     ASSERT_GE(dialog().session()->Set(dialog().brickHandle(), tessel::PropDownloadBlockSize, 2), 0);
-    ClearEvents();
-    SetText(ui::IdEditor, "program S {\n    main {\n        sound 1\n        sound 2\n"
-                          "        sound 3\n        sound 4\n        sound 5\n    }\n");
-    Click(ui::IdStress);
-    Settle();
-
+    Stress("program S {\n    main {\n        sound 1\n        sound 2\n"
+           "        sound 3\n        sound 4\n        sound 5\n    }\n",
+           "100");
     EXPECT_EQ(
         LastStatus(),
         "Error (0xe0050474) from Tessel driver: Kivo USB Tower has been unplugged from this port");
@@ -197,8 +150,8 @@ TEST_F(StressCommands, AboutShowsTwoLinesAndChangesNothing)
     EXPECT_EQ(boxes[0].caption, "Tessel Test Client");
     const std::string& text = boxes[0].text;
     const std::size_t lineFeed = text.find('\n');
-    ASSERT_NE(lineFeed, std::string::npos);
     EXPECT_EQ(text.substr(0, lineFeed), "Test application for Kivo tessel system.");
+    ASSERT_NE(lineFeed, std::string::npos);
     EXPECT_FALSE(text.substr(lineFeed + 1).empty());
     EXPECT_EQ(text.find('\n', lineFeed + 1), std::string::npos);
     EXPECT_TRUE(Statuses().empty());
