@@ -1,11 +1,15 @@
+// The brick queries and the upload's failure paths against the scripted brick; the lines of
+// a good upload are checked against the simulator.
 #include <gtest/gtest.h>
 
+#include <cstdio>
 #include <string>
 #include <vector>
 
 #include "FakeBrick.h"
 #include "tools/BrickQueries.h"
 #include "tools/FileText.h"
+#include "tools/ProgramUpload.h"
 #include "workspace/LiveObjects.h"
 
 using toolstest::FakeBrick;
@@ -45,21 +49,7 @@ TEST_F(BrickQueriesTest, VersionDigitsGiveRomFirmwareAndText)
     EXPECT_STREQ(text, "");
 }
 
-TEST_F(BrickQueriesTest, SingleValuesUseTheirAddressesAndKeepPresetsOnFailure)
-{
-    std::uint16_t slot = 0, minutes = 0, power = 0, taskByte = 0;
-    EXPECT_GE(queries.GetProgramSlot(kHandle, &slot), 0);
-    EXPECT_GE(queries.GetPowerDownTime(kHandle, &minutes), 0);
-    EXPECT_GE(queries.GetTaskByte(kHandle, 2, 3, &taskByte), 0);
-    EXPECT_EQ(slot, 1);
-    EXPECT_EQ(minutes, 10);
-    EXPECT_EQ(brick.commands, (Strings{"get 0xc924,1", "get 0xc8be,2", "get 0xc8fa,1"}));
-    brick.failing = {"get 0xc8b0,1"};
-    EXPECT_LT(queries.GetTxPower(kHandle, &power), 0);
-    EXPECT_EQ(power, 0xFFFF);
-}
-
-TEST_F(BrickQueriesTest, ArgumentErrorsContactNoBrick)
+TEST_F(BrickQueriesTest, SingleValuesUseTheirAddressesAndArgumentErrorsContactNoBrick)
 {
     tools::BrickMemoryMap map;
     std::uint16_t start = 0, size = 0, value = 0;
@@ -71,6 +61,17 @@ TEST_F(BrickQueriesTest, ArgumentErrorsContactNoBrick)
     EXPECT_EQ(queries.GetTxPower(kHandle, nullptr), kArgument);
     EXPECT_EQ(queries.GetMemoryMap(kHandle, nullptr), kArgument);
     EXPECT_TRUE(brick.commands.empty());
+
+    std::uint16_t slot = 0, minutes = 0, power = 0;
+    EXPECT_GE(queries.GetProgramSlot(kHandle, &slot), 0);
+    EXPECT_GE(queries.GetPowerDownTime(kHandle, &minutes), 0);
+    EXPECT_GE(queries.GetTaskByte(kHandle, 2, 3, &value), 0);
+    EXPECT_EQ(slot, 1);
+    EXPECT_EQ(minutes, 10);
+    EXPECT_EQ(brick.commands, (Strings{"get 0xc924,1", "get 0xc8be,2", "get 0xc8fa,1"}));
+    brick.failing = {"get 0xc8b0,1"};
+    EXPECT_LT(queries.GetTxPower(kHandle, &power), 0);
+    EXPECT_EQ(power, 0xFFFF); // the preset is kept
 }
 
 TEST_F(BrickQueriesTest, MemoryMapLocationsAndFreeMemory)
@@ -96,7 +97,7 @@ TEST_F(BrickQueriesTest, MemoryMapLocationsAndFreeMemory)
 
 // The fake empties its one result file on every execution, as the session does, so a range
 // collected there would keep only its last chunk.
-TEST_F(BrickQueriesTest, MemoryRangeOfThreeHundredBytesTakesThreeCommands)
+TEST_F(BrickQueriesTest, MemoryRangeIsReadInChunksOf128AndStopsAtAFailureOrTheTop)
 {
     for (int i = 0; i < 300; ++i)
         brick.memory[0x2000 + i] = static_cast<std::uint8_t>(i * 7);
@@ -107,37 +108,30 @@ TEST_F(BrickQueriesTest, MemoryRangeOfThreeHundredBytesTakesThreeCommands)
     EXPECT_TRUE(tools::AppendFileText(file, text));
     EXPECT_EQ(text, brick.CodeBytes(0x2000, 300));
     tools::ReleaseHandle(&file);
-}
 
-TEST_F(BrickQueriesTest, MemoryRangeStopsAfterAFailedChunkAndEndsAtTheTop)
-{
     brick.failing = {"get 0x2080,128"};
-    ReaderWriter* file = nullptr;
     EXPECT_LT(queries.ReadMemoryRange(kHandle, 0x2000, 300, &file), 0);
-    std::string text;
+    text.clear();
     EXPECT_TRUE(tools::AppendFileText(file, text));
     EXPECT_EQ(text, brick.CodeBytes(0x2000, 128));
     tools::ReleaseHandle(&file);
+
     brick.commands.clear();
     EXPECT_GE(queries.ReadMemoryRange(kHandle, 0xFFF0, 100, &file), 0);
     EXPECT_EQ(brick.commands, Strings{"get 0xfff0,16"});
     tools::ReleaseHandle(&file);
 }
 
-TEST_F(BrickQueriesTest, RoverAnswersFromItsTablesAndRefusesOtherSlots)
+TEST_F(BrickQueriesTest, AFailedUploadReadKeepsTheLinesBeforeAndSkipsTheSubroutines)
 {
-    brick.brickType = tessel::BrickRover;
-    brick.PutRoverPair(0x238 + 2, 0x0500, 0x0520);
-    brick.PutRoverPair(0x245, 0x0600, 0x0700);
-    tools::BrickMemoryMap map;
-    std::uint16_t start = 0, size = 0, freeBytes = 0;
-    EXPECT_GE(queries.GetTaskLocation(kHandle, map, 1, 2, &start, &size), 0);
-    EXPECT_EQ(start, 0x0500);
-    EXPECT_EQ(size, 0x20);
-    EXPECT_GE(queries.GetFreeMemory(kHandle, map, &freeBytes), 0);
-    EXPECT_EQ(freeBytes, 0x100 + 4);
-    EXPECT_EQ(brick.commands, (Strings{"get 0x23a,4", "get 0x245,4"}));
-    EXPECT_EQ(queries.GetTaskLocation(kHandle, map, 1, 7, &start, &size), kArgument);
-    EXPECT_EQ(queries.GetTaskLocation(kHandle, map, 2, 1, &start, &size), kArgument);
-    EXPECT_EQ(queries.GetSubLocation(kHandle, map, 1, 4, &start, &size), kArgument);
+    tools::ProgramUpload upload(queries);
+    brick.LoadProgram(1, {5}, {4, 4});
+    const std::uint16_t task1 = brick.map.words[tools::BrickMemoryMap::TaskIndex(1, 1)];
+    char failing[32];
+    std::snprintf(failing, sizeof failing, "get 0x%x,4",
+                  brick.map.words[tools::BrickMemoryMap::TaskIndex(1, 2)]);
+    brick.failing = {failing};
+    std::string lines;
+    EXPECT_EQ(upload.Run(1, lines).stop, tools::UploadStop::None);
+    EXPECT_EQ(lines, "task,0,4,0," + brick.CodeBytes(task1, 4) + "\r\n");
 }

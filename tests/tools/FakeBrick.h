@@ -1,9 +1,10 @@
-// A scripted brick behind the tools' BrickAccess seam: 64 KB of memory, a memory map, fixed
+// A scripted Onyx2 behind the tools' BrickAccess seam: 64 KB of memory, a memory map, fixed
 // answers for the single-value queries and scripted enumerations. It keeps one result file
 // that every execution empties and refills, as the session's result working file is, and
 // records every command text it is asked to translate.
 #pragma once
 
+#include <algorithm>
 #include <array>
 #include <cstdint>
 #include <cstdio>
@@ -47,11 +48,8 @@ public:
     ~FakeBrick() override { resultEntry_->release(); }
 
     // --- the scripted brick -----------------------------------------------------------
-    tessel::Short brickType = tessel::BrickOnyx2;
-    std::string brickName = "Onyx2";
     bool brickTypeFails = false;
-    tessel::Short portKind = tessel::PortSerialIr;
-    std::string portName = "COM1";
+    bool usb = false; // else a serial tower on COM1
     std::map<tessel::Short, tessel::Short> properties = {{4, 3},   {5, 5},   {6, 250}, {7, 50},
                                                          {11, 20}, {12, 40}, {13, 64}, {8, 2}};
     std::map<tessel::Short, tessel::Short> infos = {{1, 10}, {2, 8}, {3, 5}, {18, 6000}};
@@ -62,14 +60,10 @@ public:
     std::map<std::uint16_t, tessel::Long> numbers;
     // Commands whose execution fails, by exact text.
     std::vector<std::string> failing;
-    // Every execution fails: the brick does not answer.
-    bool silent = false;
     std::map<int, std::vector<EnumItem>> enums;
     // The enumeration of this type never reports "no more items"; its names carry the padding.
     int endlessEnum = -1;
     std::string endlessPadding;
-    // On a Rover, addresses name 16-bit cells, read low byte first.
-    std::map<std::uint16_t, std::uint16_t> roverCells;
     // What the brick was asked, in order.
     std::vector<std::string> commands;
 
@@ -99,13 +93,6 @@ public:
         numbers[tools::kProgramSlotAddress] = slot - 1;
     }
 
-    // Rover tables: two little-endian words at each address.
-    void PutRoverPair(std::uint16_t address, std::uint16_t first, std::uint16_t second)
-    {
-        roverCells[address] = first;
-        roverCells[static_cast<std::uint16_t>(address + 1)] = second;
-    }
-
     std::string CodeBytes(std::uint16_t start, int count) const { return ByteList(start, count); }
 
     // --- BrickAccess ----------------------------------------------------------------------
@@ -115,13 +102,13 @@ public:
         if (property == tessel::PropBrickType) {
             if (brickTypeFails)
                 return kExecFailed;
-            *value = brickType;
-            Copy(brickName, text, size);
+            *value = tessel::BrickOnyx2;
+            Copy("Onyx2", text, size);
             return kOk;
         }
         if (property == tessel::PropPort) {
-            *value = portKind;
-            Copy(portName, text, size);
+            *value = usb ? tessel::PortUsb : tessel::PortSerialIr;
+            Copy(usb ? "KIVOTOWER1" : "COM1", text, size);
             return kOk;
         }
         auto found = properties.find(property);
@@ -229,13 +216,7 @@ public:
 private:
     bool Fails(const std::string& text) const
     {
-        if (silent)
-            return true;
-        for (const std::string& f : failing) {
-            if (f == text)
-                return true;
-        }
-        return false;
+        return std::find(failing.begin(), failing.end(), text) != failing.end();
     }
 
     static std::string Hex(unsigned value, bool comma)
@@ -249,17 +230,8 @@ private:
     {
         std::string list;
         for (int i = 0; i < count; ++i)
-            list += Hex(ByteAt(start, i), i + 1 < count);
+            list += Hex(memory[(start + i) & 0xFFFF], i + 1 < count);
         return list;
-    }
-
-    std::uint8_t ByteAt(std::uint16_t start, int i) const
-    {
-        if (brickType != tessel::BrickRover)
-            return memory[(start + i) & 0xFFFF];
-        auto cell = roverCells.find(static_cast<std::uint16_t>(start + i / 2));
-        std::uint16_t value = cell != roverCells.end() ? cell->second : 0;
-        return static_cast<std::uint8_t>(i % 2 == 0 ? value & 0xFF : value >> 8);
     }
 
     static void Copy(const std::string& from, char* text, tessel::Size size)

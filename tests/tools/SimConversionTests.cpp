@@ -12,7 +12,6 @@
 #include "errors/ErrorSink.h"
 #include "session/BrickSession.h"
 #include "tessel/ReaderWriter.h"
-#include "tools/BrickQueries.h"
 #include "tools/FileText.h"
 #include "tools/MacroToCsv.h"
 #include "workspace/LiveObjects.h"
@@ -105,7 +104,7 @@ TEST_F(SimMacroToCsv, MissingHeaderIsATranslationError)
 
 class SimConvert : public commands_test::DialogFixture {};
 
-TEST_F(SimConvert, ConvertToCsvShowsTheWholeListing)
+TEST_F(SimConvert, ConvertToCsvShowsTheWholeListingOrPlacesTheCaretAtTheError)
 {
     ASSERT_NO_FATAL_FAILURE(Start(commands_test::kFastLink));
     SetText(ui::IdEditor, "program Tune { main { sound 4 } }");
@@ -116,14 +115,9 @@ TEST_F(SimConvert, ConvertToCsvShowsTheWholeListing)
     EXPECT_NE(listing.find("\r\n303,main,task,0\r\n"), std::string::npos) << listing;
     EXPECT_EQ(Statuses(), std::vector<std::string>{""});
     EXPECT_EQ(host().FocusedControl(window()), ui::IdEditor);
-}
 
-TEST_F(SimConvert, TranslationErrorPlacesTheCaretAndNamesTheError)
-{
-    ASSERT_NO_FATAL_FAILURE(Start(commands_test::kFastLink));
     const std::string script = "program Tune { main { sound 4 nonsense } }";
     SetText(ui::IdEditor, script);
-    ClearEvents();
     host().SendMessage(window(), ui::kMsgCommand, ui::MakeCommand(ui::IdConvertToCsv), 0);
     EXPECT_EQ(LastStatus().rfind("Error (0x", 0), 0u) << LastStatus();
     EXPECT_EQ(Text(ui::IdEditor), script);
