@@ -99,30 +99,30 @@ void DialogFixture::Stop(bool settle)
 
 void DialogFixture::Settle()
 {
-    for (;;) {
-        host_->DispatchPending();
-        if (dialog_->operationsInFlight() == 0 && host_->QueuedMessages() == 0)
-            return;
-        if (!host_->WaitForMessage(kHangMs)) {
-            ADD_FAILURE() << "a download or execution never reported back";
-            return;
-        }
-    }
+    Pump([this] { return dialog_->operationsInFlight() == 0 && host_->QueuedMessages() == 0; },
+         "a download or execution never reported back");
 }
 
 void DialogFixture::WaitForStatuses(std::size_t count, bool (*accept)(const std::string&))
 {
+    Pump(
+        [this, count, accept] {
+            std::size_t seen = 0;
+            for (const std::string& status : Statuses())
+                seen += accept(status) ? 1 : 0;
+            return seen >= count;
+        },
+        "not all expected texts arrived");
+}
+
+void DialogFixture::Pump(const std::function<bool()>& done, const char* hang)
+{
     for (;;) {
         host_->DispatchPending();
-        std::size_t seen = 0;
-        for (const std::string& status : Statuses()) {
-            if (accept(status))
-                ++seen;
-        }
-        if (seen >= count)
+        if (done())
             return;
         if (!host_->WaitForMessage(kHangMs)) {
-            ADD_FAILURE() << "only " << seen << " of " << count << " expected texts arrived";
+            ADD_FAILURE() << hang;
             return;
         }
     }

@@ -82,6 +82,9 @@ protected:
     std::int16_t Property(std::int16_t property);
 
 private:
+    // Handles posted reports until done; fails with hang when none arrives in a long while.
+    void Pump(const std::function<bool()>& done, const char* hang);
+
     std::filesystem::path dir_;
     std::unique_ptr<ui::HeadlessHost> host_;
     std::unique_ptr<ui::TestClientDialog> dialog_;
