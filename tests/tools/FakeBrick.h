@@ -36,15 +36,7 @@ struct EnumItem {
 
 class FakeBrick final : public tools::BrickAccess {
 public:
-    FakeBrick()
-    {
-        block_ = new MemoryBlock();
-        resultEntry_ = new MemoryEntry(block_);
-        resultEntry_->addRef();
-        numbers[tools::kTxPowerAddress] = 1;
-        numbers[tools::kPowerDownAddress] = 10 * 256;
-        numbers[tools::kProgramSlotAddress] = 0;
-    }
+    FakeBrick() { resultEntry_->addRef(); }
     ~FakeBrick() override { resultEntry_->release(); }
 
     // --- the scripted brick -----------------------------------------------------------
@@ -57,7 +49,9 @@ public:
     tools::BrickMemoryMap map;
     std::vector<std::uint8_t> version = {0, 3, 0, 1, 0, 3, 0, 9};
     // Results of "get 0x%x,n" by address, for RunImmediate.
-    std::map<std::uint16_t, tessel::Long> numbers;
+    std::map<std::uint16_t, tessel::Long> numbers = {{tools::kTxPowerAddress, 1},
+                                                     {tools::kPowerDownAddress, 10 * 256},
+                                                     {tools::kProgramSlotAddress, 0}};
     // Commands whose execution fails, by exact text.
     std::vector<std::string> failing;
     std::map<int, std::vector<EnumItem>> enums;
@@ -93,7 +87,14 @@ public:
         numbers[tools::kProgramSlotAddress] = slot - 1;
     }
 
-    std::string CodeBytes(std::uint16_t start, int count) const { return ByteList(start, count); }
+    // The brick's answer to "get start,count".
+    std::string CodeBytes(std::uint16_t start, int count) const
+    {
+        std::string list;
+        for (int i = 0; i < count; ++i)
+            list += Hex(memory[(start + i) & 0xFFFF], i + 1 < count);
+        return list;
+    }
 
     // --- BrickAccess ----------------------------------------------------------------------
     tessel::Long Get(tessel::Long, tessel::Short property, tessel::Short* value, char* text,
@@ -111,34 +112,24 @@ public:
             Copy(usb ? "KIVOTOWER1" : "COM1", text, size);
             return kOk;
         }
-        auto found = properties.find(property);
-        if (found == properties.end())
-            return kExecFailed;
-        *value = found->second;
-        return kOk;
+        return Lookup(properties, property, value);
     }
 
     tessel::Long Info(tessel::Short, tessel::Short infoId, tessel::Short* value) override
     {
-        auto found = infos.find(infoId);
-        if (found == infos.end())
-            return kExecFailed;
-        *value = found->second;
-        return kOk;
+        return Lookup(infos, infoId, value);
     }
 
     tessel::Long FindFirst(tessel::Short type, tessel::Short* item, char* name,
                            tessel::Size size) override
     {
-        *item = 0;
-        return Item(type, *item, name, size);
+        return Item(type, *item = 0, name, size);
     }
 
     tessel::Long FindNext(tessel::Short type, tessel::Short* item, char* name,
                           tessel::Size size) override
     {
-        ++*item;
-        return Item(type, *item, name, size);
+        return Item(type, ++*item, name, size);
     }
 
     tessel::Long TranslateText(tessel::Short, std::int32_t, const char* text, ReaderWriter** code,
@@ -185,7 +176,7 @@ public:
                 answer += Hex(map.words[i] & 0xFF, i + 1 < tools::BrickMemoryMap::kWordCount);
             }
         } else if (std::sscanf(text.c_str(), "get 0x%x,%d", &address, &count) == 2) {
-            answer = ByteList(static_cast<std::uint16_t>(address), count);
+            answer = CodeBytes(static_cast<std::uint16_t>(address), count);
             number = memory[address & 0xFFFF];
         }
         if (result != nullptr)
@@ -219,19 +210,21 @@ private:
         return std::find(failing.begin(), failing.end(), text) != failing.end();
     }
 
+    static tessel::Long Lookup(const std::map<tessel::Short, tessel::Short>& values,
+                               tessel::Short key, tessel::Short* value)
+    {
+        auto found = values.find(key);
+        if (found == values.end())
+            return kExecFailed;
+        *value = found->second;
+        return kOk;
+    }
+
     static std::string Hex(unsigned value, bool comma)
     {
         char text[8];
         std::snprintf(text, sizeof text, comma ? "0x%02x," : "0x%02x", value & 0xFF);
         return text;
-    }
-
-    std::string ByteList(std::uint16_t start, int count) const
-    {
-        std::string list;
-        for (int i = 0; i < count; ++i)
-            list += Hex(memory[(start + i) & 0xFFFF], i + 1 < count);
-        return list;
     }
 
     static void Copy(const std::string& from, char* text, tessel::Size size)
@@ -260,8 +253,7 @@ private:
         return static_cast<std::uint16_t>(address + size);
     }
 
-    MemoryBlock* block_ = nullptr;
-    DirEnt* resultEntry_ = nullptr;
+    DirEnt* resultEntry_ = new MemoryEntry(new MemoryBlock());
 };
 
 } // namespace toolstest
