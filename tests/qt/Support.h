@@ -8,7 +8,6 @@
 #include <QTemporaryDir>
 
 #include <deque>
-#include <mutex>
 #include <string>
 #include <vector>
 
@@ -17,7 +16,7 @@
 
 namespace qt_test {
 
-// Answers from queues given in advance; records every question, message and file dialog.
+// Answers from queues given in advance; records every question and file dialog.
 // With nothing queued, a question is answered No and a file dialog is cancelled.
 class ScriptedAnswerer final : public ui::Answerer {
 public:
@@ -44,7 +43,6 @@ public:
                        const QStringList& filters) override;
 
     std::vector<Asked> questions;
-    std::vector<Asked> messages;
     std::vector<FileDialog> fileDialogs;
 
 private:
@@ -53,7 +51,7 @@ private:
 };
 
 // A window object that records every message it receives and every message handed back
-// undelivered. Thread-safe to read while other threads post.
+// undelivered (both arrive on the window's thread).
 class RecordingObject final : public ui::WindowObject {
 public:
     struct Received {
@@ -63,17 +61,20 @@ public:
     };
 
     bool OnMessage(ui::Message message, ui::WParam wParam, ui::LParam lParam,
-                   ui::LResult& result) override;
-    void OnUndelivered(ui::Message message, ui::WParam wParam, ui::LParam lParam) override;
-
-    std::vector<Received> received() const;
-    std::vector<Received> undelivered() const;
+                   ui::LResult& result) override
+    {
+        received.push_back({message, wParam, lParam});
+        result = 0;
+        return true;
+    }
+    void OnUndelivered(ui::Message message, ui::WParam wParam, ui::LParam lParam) override
+    {
+        undelivered.push_back({message, wParam, lParam});
+    }
     int count(ui::Message message) const;
 
-private:
-    mutable std::mutex mutex_;
-    std::vector<Received> received_;
-    std::vector<Received> undelivered_;
+    std::vector<Received> received;
+    std::vector<Received> undelivered;
 };
 
 // A folder of its own with the simulator's scenario and a harbor.ini that loads the
@@ -88,7 +89,7 @@ public:
     bool isValid() const { return dir_.isValid(); }
     QString path() const { return dir_.path(); }
     QString filePath(const QString& name) const { return dir_.filePath(name); }
-    std::string commandLine(const std::string& fileArgument = "") const;
+    std::string commandLine() const;
     QString writeFile(const QString& name, const QByteArray& bytes) const;
 
 private:

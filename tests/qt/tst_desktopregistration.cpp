@@ -8,8 +8,6 @@
 #include <QTemporaryDir>
 #include <QTest>
 
-#include <cstdlib>
-
 #include "app/DesktopFiles.h"
 #include "app/Registration.h"
 
@@ -34,33 +32,14 @@ QString LineStarting(const QString& text, const QString& key)
     return QString();
 }
 
-// Sets or unsets an environment variable for the scope of a test.
-class ScopedEnv {
-public:
-    ScopedEnv(const char* name, const char* value) : name_(name)
-    {
-        const char* old = std::getenv(name);
-        had_ = old != nullptr;
-        if (had_)
-            old_ = old;
-        if (value != nullptr)
-            ::setenv(name, value, 1);
-        else
-            ::unsetenv(name);
-    }
-    ~ScopedEnv()
-    {
-        if (had_)
-            ::setenv(name_, old_.c_str(), 1);
-        else
-            ::unsetenv(name_);
-    }
-
-private:
-    const char* name_;
-    bool had_ = false;
-    std::string old_;
-};
+// Sets name to value, or unsets it for a null value.
+void SetEnv(const char* name, const QByteArray& value)
+{
+    if (value.isNull())
+        qunsetenv(name);
+    else
+        qputenv(name, value);
+}
 
 } // namespace
 
@@ -68,28 +47,29 @@ class tst_DesktopRegistration : public QObject {
     Q_OBJECT
 
 private slots:
-    void registerWritesEntryAndMimeType();
+    void registerThenUnregister();
     void execLine_data();
     void execLine();
-    void unregisterRemovesBoth();
     void registerFailsWhereNothingCanBeWritten();
     void userDataHome_data();
     void userDataHome();
     void programSwitchesRegisterAndRemove();
 };
 
-void tst_DesktopRegistration::registerWritesEntryAndMimeType()
+void tst_DesktopRegistration::registerThenUnregister()
 {
     QTemporaryDir data;
     const DesktopRegistration registration(data.path().toStdString(), "/opt/harbor/harbor");
     std::string report;
     QCOMPARE(registration.Register(report), 0);
 
-    QCOMPARE(QString::fromStdString(registration.desktopEntryPath()),
-             data.filePath("applications/harbor.desktop"));
-    QCOMPARE(QString::fromStdString(registration.mimePackagePath()),
-             data.filePath("mime/packages/harbor-onyx2.xml"));
-    const QString entry = ReadText(data.filePath("applications/harbor.desktop"));
+    const QString entryPath = data.filePath("applications/harbor.desktop");
+    const QString packagePath = data.filePath("mime/packages/harbor-onyx2.xml");
+    const bool mimeTool =
+        !QStandardPaths::findExecutable(QStringLiteral("update-mime-database")).isEmpty();
+    QCOMPARE(QString::fromStdString(registration.desktopEntryPath()), entryPath);
+    QCOMPARE(QString::fromStdString(registration.mimePackagePath()), packagePath);
+    const QString entry = ReadText(entryPath);
     QVERIFY(entry.startsWith(QStringLiteral("[Desktop Entry]\n")));
     QCOMPARE(LineStarting(entry, "Exec="), QStringLiteral("Exec=/opt/harbor/harbor %f"));
     QCOMPARE(LineStarting(entry, "TryExec="), QStringLiteral("TryExec=/opt/harbor/harbor"));
@@ -97,8 +77,7 @@ void tst_DesktopRegistration::registerWritesEntryAndMimeType()
     QCOMPARE(LineStarting(entry, "Type="), QStringLiteral("Type=Application"));
     QVERIFY(!entry.contains(QLatin1Char('@')));
 
-    const QString package = ReadText(data.filePath("mime/packages/harbor-onyx2.xml"));
-    QVERIFY(package.contains(QStringLiteral("<mime-type type=\"text/x-onyx2\">")));
+    const QString package = ReadText(packagePath);
     QVERIFY(package.contains(QStringLiteral("<glob pattern=\"*.onyx2\"/>")));
     QCOMPARE(package, ReadText(HARBOR_SOURCE_DIR "/resources/desktop/harbor-onyx2.xml"));
 
@@ -107,7 +86,7 @@ void tst_DesktopRegistration::registerWritesEntryAndMimeType()
     QVERIFY(report.find(registration.desktopEntryPath()) != std::string::npos);
     QVERIFY(report.find(registration.mimePackagePath()) != std::string::npos);
     // Where the desktop's tool is installed, the MIME database knows the type afterwards.
-    if (!QStandardPaths::findExecutable(QStringLiteral("update-mime-database")).isEmpty()) {
+    if (mimeTool) {
         QVERIFY(QFileInfo::exists(data.filePath("mime/text/x-onyx2.xml")));
         QVERIFY(report.find("update-mime-database") != std::string::npos);
     }
@@ -115,6 +94,15 @@ void tst_DesktopRegistration::registerWritesEntryAndMimeType()
     QCOMPARE(QDir(data.filePath("applications")).entryList(QDir::Files),
              QStringList({"harbor.desktop"}) +
                  QDir(data.filePath("applications")).entryList({"*.cache"}, QDir::Files));
+
+    QCOMPARE(registration.Unregister(report), 0);
+    QVERIFY(!QFileInfo::exists(entryPath) && !QFileInfo::exists(packagePath));
+    QVERIFY(report.find(registration.desktopEntryPath()) != std::string::npos);
+    if (mimeTool)
+        QVERIFY(!QFileInfo::exists(data.filePath("mime/text/x-onyx2.xml")));
+    // A second removal finds nothing and still succeeds.
+    QCOMPARE(registration.Unregister(report), 0);
+    QVERIFY(report.find("nothing to remove") != std::string::npos);
 }
 
 void tst_DesktopRegistration::execLine_data()
@@ -143,23 +131,6 @@ void tst_DesktopRegistration::execLine()
     const QString entry =
         QString::fromStdString(DesktopRegistration::DesktopEntry(program.toStdString()));
     QCOMPARE(LineStarting(entry, "Exec="), exec);
-}
-
-void tst_DesktopRegistration::unregisterRemovesBoth()
-{
-    QTemporaryDir data;
-    const DesktopRegistration registration(data.path().toStdString(), "/opt/harbor/harbor");
-    std::string report;
-    QCOMPARE(registration.Register(report), 0);
-    QCOMPARE(registration.Unregister(report), 0);
-    QVERIFY(!QFileInfo::exists(data.filePath("applications/harbor.desktop")));
-    QVERIFY(!QFileInfo::exists(data.filePath("mime/packages/harbor-onyx2.xml")));
-    QVERIFY(report.find(registration.desktopEntryPath()) != std::string::npos);
-    if (!QStandardPaths::findExecutable(QStringLiteral("update-mime-database")).isEmpty())
-        QVERIFY(!QFileInfo::exists(data.filePath("mime/text/x-onyx2.xml")));
-    // A second removal finds nothing and still succeeds.
-    QCOMPARE(registration.Unregister(report), 0);
-    QVERIFY(report.find("nothing to remove") != std::string::npos);
 }
 
 void tst_DesktopRegistration::registerFailsWhereNothingCanBeWritten()
@@ -196,9 +167,17 @@ void tst_DesktopRegistration::userDataHome()
     QFETCH(QByteArray, xdg);
     QFETCH(QByteArray, home);
     QFETCH(QString, expected);
-    const ScopedEnv xdgEnv("XDG_DATA_HOME", xdg.isNull() ? nullptr : xdg.constData());
-    const ScopedEnv homeEnv("HOME", home.isNull() ? nullptr : home.constData());
-    QCOMPARE(QString::fromStdString(DesktopRegistration::UserDataHome()), expected);
+    const auto saved = [](const char* name) {
+        return qEnvironmentVariableIsSet(name) ? qgetenv(name) : QByteArray();
+    };
+    const QByteArray oldXdg = saved("XDG_DATA_HOME");
+    const QByteArray oldHome = saved("HOME");
+    SetEnv("XDG_DATA_HOME", xdg);
+    SetEnv("HOME", home);
+    const QString found = QString::fromStdString(DesktopRegistration::UserDataHome());
+    SetEnv("XDG_DATA_HOME", oldXdg);
+    SetEnv("HOME", oldHome);
+    QCOMPARE(found, expected);
 }
 
 void tst_DesktopRegistration::programSwitchesRegisterAndRemove()

@@ -43,9 +43,6 @@ void tst_GuiHost::withoutDisplay_data()
     QTest::newRow("display unreachable") << "xcb"
                                          << ":4711"
                                          << "cannot be reached";
-    QTest::newRow("unknown platform") << "no-such-platform"
-                                      << ""
-                                      << "cannot be reached";
 }
 
 void tst_GuiHost::withoutDisplay()

