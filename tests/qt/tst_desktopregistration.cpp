@@ -8,6 +8,7 @@
 #include <QTemporaryDir>
 #include <QTest>
 
+#include "Support.h"
 #include "app/DesktopFiles.h"
 #include "app/Registration.h"
 
@@ -17,10 +18,7 @@ namespace {
 
 QString ReadText(const QString& path)
 {
-    QFile file(path);
-    if (!file.open(QIODevice::ReadOnly))
-        return QString();
-    return QString::fromUtf8(file.readAll());
+    return QString::fromUtf8(qt_test::ReadAll(path));
 }
 
 QString LineStarting(const QString& text, const QString& key)

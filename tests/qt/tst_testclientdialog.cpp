@@ -10,7 +10,6 @@
 #include <QTimer>
 
 #include <memory>
-#include <thread>
 
 #include "Support.h"
 #include "session/BrickSession.h"
@@ -45,7 +44,6 @@ private slots:
     void clickChangesStatus_data();
     void clickChangesStatus();
     void longDownloadKeepsTheWindowResponsive();
-    void messagePostedFromAnotherThreadReachesStatus();
     void fileOpenAndSaveThroughTheAnswerer();
     void failureOffersTroubleShooterOwnedByTheDialog();
 
@@ -231,19 +229,6 @@ void tst_TestClientDialog::longDownloadKeepsTheWindowResponsive()
     QVERIFY2(seen.first().startsWith(QLatin1String("Downloading: ")), qPrintable(seen.join('|')));
     // The loop kept running meanwhile: timers fired, and so would paint and input events.
     QVERIFY(ticks > ticksAtClick);
-}
-
-void tst_TestClientDialog::messagePostedFromAnotherThreadReachesStatus()
-{
-    start(qt_test::kFastLink, "");
-    const ui::WindowHandle handle = dialog_->handle();
-    ui::QtHost* host = host_.get();
-    std::thread poster([host, handle] {
-        host->PostMessage(handle, ui::kMsgBrickMessage, 0, 42);
-        host->PostMessage(handle, ui::kMsgUser + 5, 0, 0); // ignored
-    });
-    poster.join();
-    QTRY_COMPARE(status(), QStringLiteral("Received PBMessage: 42"));
 }
 
 void tst_TestClientDialog::fileOpenAndSaveThroughTheAnswerer()
