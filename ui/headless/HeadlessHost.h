@@ -20,6 +20,7 @@
 #include <vector>
 
 #include "ui/DialogLayout.h"
+#include "ui/PostedMessage.h"
 #include "ui/Window.h"
 
 namespace ui {
@@ -151,12 +152,7 @@ private:
         std::set<int> menuIds;
         int focus = 0;
     };
-    struct Posted {
-        WindowHandle window;
-        Message message;
-        WParam wParam;
-        LParam lParam;
-    };
+    using Posted = PostedMessage;
 
     Window* find(WindowHandle window);
     const Window* find(WindowHandle window) const;

@@ -269,14 +269,7 @@ void QtHost::DestroyWindow(WindowHandle window)
     std::deque<Posted> dropped;
     {
         std::lock_guard<std::mutex> lock(mutex_);
-        for (auto it = queue_.begin(); it != queue_.end();) {
-            if (it->window == window) {
-                dropped.push_back(*it);
-                it = queue_.erase(it);
-            } else {
-                ++it;
-            }
-        }
+        dropped = TakeMessagesFor(queue_, window);
     }
     for (const Posted& posted : dropped)
         object->OnUndelivered(posted.message, posted.wParam, posted.lParam);

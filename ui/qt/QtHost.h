@@ -20,6 +20,7 @@
 #include <set>
 #include <vector>
 
+#include "ui/PostedMessage.h"
 #include "ui/Window.h"
 #include "ui/qt/EditText.h"
 
@@ -118,12 +119,7 @@ private:
         QPointer<QObject> plain;       // the plain window's stand-in object
         QHash<int, EditEncoding> encodings;
     };
-    struct Posted {
-        WindowHandle window;
-        Message message;
-        WParam wParam;
-        LParam lParam;
-    };
+    using Posted = PostedMessage;
 
     Window* find(WindowHandle window);
     const Window* find(WindowHandle window) const;
