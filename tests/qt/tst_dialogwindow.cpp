@@ -12,6 +12,7 @@
 
 #include "ui/TestClientDialog.h"
 #include "ui/qt/DialogWindow.h"
+#include "ui/qt/HostStyle.h"
 
 using ui::DialogWindow;
 
@@ -25,6 +26,7 @@ private slots:
     void menu();
     void controlsSendTheirCommands();
     void escapeAndCloseBoxSendCancel();
+    void hostStyleDrawsTheSameArrows();
 };
 
 void tst_DialogWindow::windowAndLayout()
@@ -209,6 +211,23 @@ void tst_DialogWindow::escapeAndCloseBoxSendCancel()
     QCOMPARE(commands.at(1).at(0).toInt(), ui::kIdCancel);
     window.allowClose();
     QVERIFY(window.close());
+}
+
+// The host style only puts off loading the menu bar's overflow arrows: once painted, they are
+// the base style's own, pixel for pixel; every other icon is the base style's at once.
+void tst_DialogWindow::hostStyleDrawsTheSameArrows()
+{
+    ui::HostStyle host(QStringLiteral("fusion"));
+    const QStyle* base = host.baseStyle();
+    for (QStyle::StandardPixmap which :
+         {QStyle::SP_ToolBarHorizontalExtensionButton, QStyle::SP_ToolBarVerticalExtensionButton,
+          QStyle::SP_DialogOkButton}) {
+        const QIcon deferred = host.standardIcon(which);
+        QVERIFY(!deferred.isNull());
+        const QImage drawn = deferred.pixmap(QSize(16, 16)).toImage();
+        QVERIFY(!drawn.isNull());
+        QCOMPARE(drawn, base->standardIcon(which).pixmap(QSize(16, 16)).toImage());
+    }
 }
 
 QTEST_MAIN(tst_DialogWindow)

@@ -4,12 +4,15 @@
 #include <QApplication>
 #include <QByteArray>
 #include <QStringList>
+#include <QStyle>
 
 #include <cstdio>
 #include <cstdlib>
 #include <string>
 
 #include "platform/ExecutablePath.h"
+#include "ui/qt/FontWarmUp.h"
+#include "ui/qt/HostStyle.h"
 #include "ui/qt/QtHost.h"
 
 namespace {
@@ -47,6 +50,7 @@ namespace app {
 
 std::unique_ptr<ui::WindowHost> CreateGuiHost(int& argc, char** argv)
 {
+    auto fonts = std::make_unique<ui::FontWarmUp>();
     const QtMessageHandler previous = qInstallMessageHandler(StartupMessageHandler);
     auto application = std::make_unique<QApplication>(argc, argv);
     qInstallMessageHandler(previous);
@@ -57,10 +61,15 @@ std::unique_ptr<ui::WindowHost> CreateGuiHost(int& argc, char** argv)
     // The dialog ends the program by its Exit command, not the last window that closes:
     // the help viewer may be the last one shown.
     QApplication::setQuitOnLastWindowClosed(false);
+    // The style the platform, QT_STYLE_OVERRIDE or -style chose, by name: the application
+    // deletes its own style when it is given another, and owns the new one.
+    auto* style = new ui::HostStyle(QApplication::style()->name());
+    QApplication::setStyle(style); // NOLINT(clang-analyzer-cplusplus.NewDeleteLeaks)
 
     // The build and the installation put the help file into help/ beside the program.
     auto host = std::make_unique<ui::QtHost>(platform::ExecutableDirectory() + "help/");
     host->AdoptApplication(std::move(application));
+    host->AdoptFontWarmUp(std::move(fonts));
     // For start-up benchmarks: the program ends as soon as its window is up.
     const char* exitWhenShown = std::getenv("HARBOR_EXIT_WHEN_SHOWN");
     if (exitWhenShown != nullptr && exitWhenShown[0] != '\0')

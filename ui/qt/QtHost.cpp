@@ -25,6 +25,7 @@
 #include "ui/TestClientDialog.h"
 #include "ui/qt/Answerer.h"
 #include "ui/qt/DialogWindow.h"
+#include "ui/qt/FontWarmUp.h"
 #include "ui/qt/QtHelpViewer.h"
 
 namespace ui {
@@ -117,6 +118,11 @@ void QtHost::AdoptApplication(std::unique_ptr<QApplication> application)
     application_ = std::move(application);
 }
 
+void QtHost::AdoptFontWarmUp(std::unique_ptr<FontWarmUp> warmUp)
+{
+    fontWarmUp_ = std::move(warmUp);
+}
+
 void QtHost::SetAnswerer(Answerer* answerer)
 {
     answerer_ = answerer != nullptr ? answerer : systemAnswerer_.get();
@@ -178,6 +184,8 @@ WindowHandle QtHost::CreateDialogWindow(const DialogTemplate& layout, WindowObje
     const WindowHandle handle = nextHandle_++;
     Window& window = windows_[handle];
     window.object = object;
+    if (fontWarmUp_)
+        fontWarmUp_->Wait();
     window.dialog = new DialogWindow(layout);
     QObject::connect(window.dialog.data(), &DialogWindow::commandIssued, receiver_.get(),
                      [this, handle](int id) { onDialogCommand(handle, id); });

@@ -33,6 +33,7 @@ namespace ui {
 
 class Answerer;
 class DialogWindow;
+class FontWarmUp;
 class QtHelpViewer;
 
 class QtHost final : public WindowHost {
@@ -47,6 +48,9 @@ public:
 
     // The host owns the application from now on and destroys it last, after every window.
     void AdoptApplication(std::unique_ptr<QApplication> application);
+    // The font configuration still loading beside the start-up; the first dialog window
+    // waits for it before it measures its text.
+    void AdoptFontWarmUp(std::unique_ptr<FontWarmUp> warmUp);
 
     // Who answers questions and file dialogs; null restores the real boxes. Not owned.
     void SetAnswerer(Answerer* answerer);
@@ -137,6 +141,7 @@ private:
 
     // Declared first, destroyed last: every widget goes before the application does.
     std::unique_ptr<QApplication> application_;
+    std::unique_ptr<FontWarmUp> fontWarmUp_;
 
     std::unique_ptr<Receiver> receiver_;
     std::unique_ptr<Answerer> systemAnswerer_;
