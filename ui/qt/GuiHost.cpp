@@ -4,7 +4,6 @@
 #include <QApplication>
 #include <QByteArray>
 #include <QStringList>
-#include <QStyle>
 
 #include <cstdio>
 #include <cstdlib>
@@ -61,10 +60,7 @@ std::unique_ptr<ui::WindowHost> CreateGuiHost(int& argc, char** argv)
     // The dialog ends the program by its Exit command, not the last window that closes:
     // the help viewer may be the last one shown.
     QApplication::setQuitOnLastWindowClosed(false);
-    // The style the platform, QT_STYLE_OVERRIDE or -style chose, by name: the application
-    // deletes its own style when it is given another, and owns the new one.
-    auto* style = new ui::HostStyle(QApplication::style()->name());
-    QApplication::setStyle(style); // NOLINT(clang-analyzer-cplusplus.NewDeleteLeaks)
+    ui::HostStyle::Install();
 
     // The build and the installation put the help file into help/ beside the program.
     auto host = std::make_unique<ui::QtHost>(platform::ExecutableDirectory() + "help/");

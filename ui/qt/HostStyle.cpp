@@ -1,5 +1,6 @@
 #include "ui/qt/HostStyle.h"
 
+#include <QApplication>
 #include <QIconEngine>
 #include <QPainter>
 #include <QPixmap>
@@ -69,6 +70,15 @@ private:
 } // namespace
 
 HostStyle::HostStyle(const QString& key) : QProxyStyle(key) {}
+
+// The application owns the style it is given; the analyser does not know that.
+// NOLINTBEGIN(clang-analyzer-cplusplus.NewDeleteLeaks)
+void HostStyle::Install()
+{
+    // By name: the application deletes its own style when it is given another.
+    QApplication::setStyle(new HostStyle(QApplication::style()->name()));
+}
+// NOLINTEND(clang-analyzer-cplusplus.NewDeleteLeaks)
 
 QIcon HostStyle::standardIcon(StandardPixmap which, const QStyleOption* option,
                               const QWidget* widget) const

@@ -16,6 +16,10 @@ public:
     // Over the style named key, as QStyleFactory knows it.
     explicit HostStyle(const QString& key);
 
+    // Puts the host style over the style the platform, QT_STYLE_OVERRIDE or -style chose.
+    // The application object must exist; it owns the style from then on.
+    static void Install();
+
     QIcon standardIcon(StandardPixmap which, const QStyleOption* option = nullptr,
                        const QWidget* widget = nullptr) const override;
 };
