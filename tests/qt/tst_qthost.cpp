@@ -65,6 +65,7 @@ private slots:
     void quitEndsNestedPumpAndLoop();
     void textRoundTrip_data();
     void textRoundTrip();
+    void typedTextAsBytes();
     void selectionInBytes_data();
     void selectionInBytes();
     void listsAndChecks();
@@ -208,6 +209,41 @@ void tst_QtHost::textRoundTrip()
     QCOMPARE(host_->GetControlText(dialog_, id, buffer, 0), std::uint32_t(0));
     QCOMPARE(host_->GetControlText(dialog_, 4711, buffer, sizeof buffer), std::uint32_t(0));
     QCOMPARE(buffer[0], '\0');
+}
+
+// What the editor holds after typing, as the dialog reads it: document breaks as the text's
+// own line ends, long lines and short ones alike; a character the text's encoding cannot
+// hold as '?'. A length query followed by an edit never hands out the text it measured.
+void tst_QtHost::typedTextAsBytes()
+{
+    auto* editor = qobject_cast<QPlainTextEdit*>(host_->dialogWindow(dialog_)->control(1015));
+    const auto read = [this] {
+        const std::uint32_t length = host_->GetControlTextLength(dialog_, 1015);
+        const QByteArray bytes = QByteArray::fromStdString(Text(*host_, dialog_, 1015, 1 << 16));
+        return length == std::uint32_t(bytes.size()) ? bytes : QByteArray("length differs");
+    };
+
+    host_->SetControlText(dialog_, 1015, "task main\r\n");
+    editor->moveCursor(QTextCursor::End);
+    const QString line = QStringLiteral("a long line of script text, well past a few characters");
+    editor->insertPlainText(line + QChar(QChar::LineSeparator) + QStringLiteral("x\ny") +
+                            QChar(QChar::ParagraphSeparator) + QStringLiteral("\u00e9\U0001F600"));
+    QCOMPARE(read(), "task main\r\n" + line.toUtf8() + "\r\nx\r\ny\r\n\xc3\xa9\xf0\x9f\x98\x80");
+
+    host_->SetControlText(dialog_, 1015, "Gr\xfc\xdf\n"); // not UTF-8: one byte a character
+    editor->moveCursor(QTextCursor::End);
+    editor->insertPlainText(QStringLiteral("\u00e9\u20ac"));
+    QCOMPARE(read(), QByteArray("Gr\xfc\xdf\n\xe9?"));
+
+    host_->SetControlText(dialog_, 1015, "measured");
+    QCOMPARE(host_->GetControlTextLength(dialog_, 1015), std::uint32_t(8));
+    editor->moveCursor(QTextCursor::End);
+    editor->insertPlainText(QStringLiteral(" then typed"));
+    QCOMPARE(QByteArray::fromStdString(Text(*host_, dialog_, 1015)),
+             QByteArray("measured then typed"));
+    QCOMPARE(host_->GetControlTextLength(dialog_, 1015), std::uint32_t(19));
+    host_->SetControlText(dialog_, 1015, "set anew");
+    QCOMPARE(QByteArray::fromStdString(Text(*host_, dialog_, 1015)), QByteArray("set anew"));
 }
 
 void tst_QtHost::selectionInBytes_data()

@@ -1,6 +1,11 @@
 #include "ui/qt/EditText.h"
 
 #include <QStringDecoder>
+#include <QStringEncoder>
+
+#if defined(__SSE2__)
+#include <emmintrin.h>
+#endif
 
 namespace ui {
 
@@ -26,6 +31,43 @@ qint64 EncodedLength(QChar c, QChar next, const EditEncoding& encoding, int* con
     return 3;
 }
 
+bool IsLineBreak(char16_t c, bool documentBreaks)
+{
+    return c == u'\n' ||
+           (documentBreaks && (c == QChar::ParagraphSeparator || c == QChar::LineSeparator));
+}
+
+// Where the next line break is, from from on; the text's size when there is none. Eight
+// characters a step where the processor allows: a script's lines are long enough for it.
+qsizetype NextLineBreak(QStringView text, qsizetype from, bool documentBreaks)
+{
+    const char16_t* data = text.utf16();
+    const qsizetype size = text.size();
+    qsizetype i = from;
+#if defined(__SSE2__)
+    const __m128i lineFeed = _mm_set1_epi16('\n');
+    // U+2028 and U+2029 differ in the lowest bit only.
+    const __m128i separatorBits = _mm_set1_epi16(static_cast<short>(0xFFFE));
+    const __m128i separator = _mm_set1_epi16(static_cast<short>(QChar::LineSeparator));
+    for (; i + 8 <= size; i += 8) {
+        const __m128i chunk = _mm_loadu_si128(reinterpret_cast<const __m128i*>(data + i));
+        __m128i hits = _mm_cmpeq_epi16(chunk, lineFeed);
+        if (documentBreaks) {
+            hits =
+                _mm_or_si128(hits, _mm_cmpeq_epi16(_mm_and_si128(chunk, separatorBits), separator));
+        }
+        const int mask = _mm_movemask_epi8(hits);
+        if (mask != 0)
+            return i + __builtin_ctz(static_cast<unsigned>(mask)) / 2;
+    }
+#endif
+    for (; i < size; ++i) {
+        if (IsLineBreak(data[i], documentBreaks))
+            return i;
+    }
+    return size;
+}
+
 } // namespace
 
 QString PlainLines(QString text)
@@ -48,14 +90,31 @@ QString DecodeEditText(const QByteArray& bytes, EditEncoding& encoding)
     return text;
 }
 
-QByteArray EncodeEditText(const QString& text, const EditEncoding& encoding)
+QByteArray EncodeEditText(QStringView text, const EditEncoding& encoding, bool documentBreaks)
 {
-    QString lines = text;
-    if (encoding.crlf)
-        lines.replace(QLatin1Char('\n'), QLatin1String("\r\n"));
     // A character outside Latin-1 typed into a Latin-1 text cannot be written as one byte;
-    // it becomes '?', as a code-page conversion would make it.
-    return encoding.latin1 ? lines.toLatin1() : lines.toUtf8();
+    // it becomes '?', as a code-page conversion would make it. Stateless: each line is
+    // encoded as a whole text would be, and no surrogate pair spans a line break.
+    QStringEncoder encoder(encoding.latin1 ? QStringEncoder::Latin1 : QStringEncoder::Utf8,
+                           QStringEncoder::Flag::Stateless);
+    // Enough for the worst case: UTF-8 takes at most three bytes a character, which covers
+    // a CR LF too; Latin-1 takes one, and a CR LF one more.
+    QByteArray bytes(encoder.requiredSpace(text.size()) + (encoding.crlf ? text.size() : 0),
+                     Qt::Uninitialized);
+    char* out = bytes.data();
+    qsizetype lineStart = 0;
+    for (;;) {
+        const qsizetype lineBreak = NextLineBreak(text, lineStart, documentBreaks);
+        out = encoder.appendToBuffer(out, text.sliced(lineStart, lineBreak - lineStart));
+        if (lineBreak == text.size())
+            break;
+        if (encoding.crlf)
+            *out++ = '\r';
+        *out++ = '\n';
+        lineStart = lineBreak + 1;
+    }
+    bytes.truncate(out - bytes.constData());
+    return bytes;
 }
 
 int PositionOfByteOffset(const QString& text, const EditEncoding& encoding, qint64 offset)

@@ -25,8 +25,11 @@ QString PlainLines(QString text);
 // lone CR into a line break. encoding tells how to write the result back.
 QString DecodeEditText(const QByteArray& bytes, EditEncoding& encoding);
 
-// The widget's text as bytes written the way encoding says.
-QByteArray EncodeEditText(const QString& text, const EditEncoding& encoding);
+// The widget's text as bytes written the way encoding says. With documentBreaks, a
+// document's paragraph and line separators are line breaks too, so a document's raw text
+// goes out in one pass, without PlainLines first.
+QByteArray EncodeEditText(QStringView text, const EditEncoding& encoding,
+                          bool documentBreaks = false);
 
 // A byte offset into EncodeEditText(text) as a character position of text, and back. An
 // offset inside a multi-byte character or a CR LF pair counts as the position after it;

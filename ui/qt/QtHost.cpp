@@ -434,6 +434,7 @@ void QtHost::SetControlText(WindowHandle dialog, int id, const char* text)
     EditEncoding encoding;
     const QString value = DecodeEditText(QByteArray(text ? text : ""), encoding);
     find(dialog)->encodings.insert(id, encoding);
+    measured_.Drop();
     if (auto* edit = qobject_cast<QPlainTextEdit*>(widget)) {
         edit->setPlainText(value);
     } else if (auto* line = qobject_cast<QLineEdit*>(widget)) {
@@ -451,10 +452,15 @@ QByteArray QtHost::controlBytes(WindowHandle dialog, int id)
     if (widget == nullptr)
         return {};
     const EditEncoding encoding = find(dialog)->encodings.value(id);
+    // The document's raw text keeps every character; its breaks are written in the same pass.
+    if (auto* edit = qobject_cast<QPlainTextEdit*>(widget)) {
+        QByteArray bytes;
+        if (!measured_.Take(edit->document(), bytes))
+            bytes = EncodeEditText(edit->document()->toRawText(), encoding, true);
+        return bytes;
+    }
     QString value;
-    if (auto* edit = qobject_cast<QPlainTextEdit*>(widget))
-        value = PlainEditText(edit);
-    else if (auto* line = qobject_cast<QLineEdit*>(widget))
+    if (auto* line = qobject_cast<QLineEdit*>(widget))
         value = line->text();
     else if (auto* button = qobject_cast<QAbstractButton*>(widget))
         value = button->text();
@@ -480,7 +486,11 @@ std::uint32_t QtHost::GetControlText(WindowHandle dialog, int id, char* buffer, 
 
 std::uint32_t QtHost::GetControlTextLength(WindowHandle dialog, int id)
 {
-    return static_cast<std::uint32_t>(controlBytes(dialog, id).size());
+    QByteArray bytes = controlBytes(dialog, id);
+    const auto length = static_cast<std::uint32_t>(bytes.size());
+    if (auto* edit = qobject_cast<QPlainTextEdit*>(control(dialog, id)))
+        measured_.Keep(edit->document(), std::move(bytes));
+    return length;
 }
 
 void QtHost::SetCheck(WindowHandle dialog, int id, bool checked)

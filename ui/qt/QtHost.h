@@ -23,6 +23,7 @@
 #include "ui/PostedMessage.h"
 #include "ui/Window.h"
 #include "ui/qt/EditText.h"
+#include "ui/qt/MeasuredText.h"
 
 class QApplication;
 class QEventLoop;
@@ -128,7 +129,8 @@ private:
     Window* find(WindowHandle window);
     const Window* find(WindowHandle window) const;
     QWidget* control(WindowHandle dialog, int id) const;
-    // The control's text as the dialog reads it: bytes, written as they were set.
+    // The control's text as the dialog reads it: bytes, written as they were set. A
+    // multi-line edit's bytes that measured keeps are taken instead of converted again.
     QByteArray controlBytes(WindowHandle dialog, int id);
     QWidget* ownerWidget(WindowHandle owner) const;
     bool chooseFile(const FileDialogRequest& request, bool save);
@@ -169,6 +171,8 @@ private:
     // Windows whose widgets wait for deletion until control is back in the event loop.
     std::vector<QPointer<QObject>> doomed_;
     bool exitWhenShown_ = false;
+    // What GetControlTextLength converted, for the GetControlText after it.
+    MeasuredText measured_;
 };
 
 } // namespace ui
