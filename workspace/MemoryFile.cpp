@@ -171,34 +171,46 @@ std::int32_t TextMemoryReaderWriter::read(void* buffer, std::int32_t count)
     if (count < 1 || buffer == nullptr) {
         return 0;
     }
-    // Works on the block's bytes directly: the same steps as taking them one by one with
-    // getByte(), without a call per byte.
+    // Works on the block's bytes directly, with the same result as taking them one by one
+    // with getByte(): runs between CRs are copied whole.
     auto* out = static_cast<unsigned char*>(buffer);
     const unsigned char* data = block_->bytes();
     const std::int32_t length = block_->size();
     std::int32_t position = position_;
-    std::int32_t stored = 0;
-    if (position < 0) {
+    if (position < 0 || position >= length) {
         return 0;
     }
-    while (stored < count && position < length) {
-        const unsigned char c = data[position++];
-        if (c == kCr) {
-            // CR LF becomes LF; a CR before anything else, or at the very end, stays a CR and
-            // the byte after it is taken on its own.
-            if (position < length && data[position] == kLf) {
-                ++position;
-                out[stored++] = kLf;
-            } else {
-                out[stored++] = kCr;
-            }
-        } else if (c == kCtrlZ) {
-            // The text ends here; the position stays on the Ctrl-Z, so later reads give 0
-            // until the caller moves past it.
-            --position;
+    // The text ends at a Ctrl-Z, and the position stays on it, so later reads give 0 until
+    // the caller moves past it. A byte handed out takes at most two stored bytes, so the
+    // Ctrl-Z is looked for no further than that.
+    const std::int64_t window = std::min<std::int64_t>(length - position, 2 * std::int64_t{count});
+    const void* ctrlZ = std::memchr(data + position, kCtrlZ, static_cast<std::size_t>(window));
+    const std::int32_t end =
+        ctrlZ != nullptr
+            ? static_cast<std::int32_t>(static_cast<const unsigned char*>(ctrlZ) - data)
+            : position + static_cast<std::int32_t>(window);
+    std::int32_t stored = 0;
+    while (stored < count && position < end) {
+        const auto available = static_cast<std::size_t>(std::min(end - position, count - stored));
+        const void* cr = std::memchr(data + position, kCr, available);
+        const std::size_t run = cr != nullptr
+                                    ? static_cast<std::size_t>(
+                                          static_cast<const unsigned char*>(cr) - (data + position))
+                                    : available;
+        std::memcpy(out + stored, data + position, run);
+        stored += static_cast<std::int32_t>(run);
+        position += static_cast<std::int32_t>(run);
+        if (cr == nullptr) {
             break;
+        }
+        // CR LF becomes LF; a CR before anything else, or at the very end, stays a CR and
+        // the byte after it is taken on its own.
+        ++position;
+        if (position < length && data[position] == kLf) {
+            ++position;
+            out[stored++] = kLf;
         } else {
-            out[stored++] = c;
+            out[stored++] = kCr;
         }
     }
     position_ = position;
