@@ -12,8 +12,29 @@
 #ifndef HARBOR_SIM_DIR
 #define HARBOR_SIM_DIR ""
 #endif
+#ifndef HARBOR_TESTLIB_DIR
+#define HARBOR_TESTLIB_DIR ""
+#endif
 
 namespace commands_test {
+
+std::string SimulatorDirectory()
+{
+    return HARBOR_SIM_DIR;
+}
+
+std::string RecordingLibraryDirectory()
+{
+    return HARBOR_TESTLIB_DIR;
+}
+
+std::string SoundProgram(int count)
+{
+    std::string text = "tobj 1 6 program\ntask 0\n";
+    for (int i = 0; i < count; ++i)
+        text += "cmd 20 04\n";
+    return text + "end\n";
+}
 
 namespace {
 
@@ -21,80 +42,87 @@ namespace {
 // reaching it means a report never came.
 constexpr int kHangMs = 20000;
 
-int NextDirectoryNumber()
+// The profile reader takes the first section of a name only, so the library directory and
+// the memory files go into the test's own PATHS and DEBUG sections when it has them.
+std::string MergeSettings(const std::string& extra, const std::string& libraryDirectory)
 {
-    static int number = 0;
-    return ++number;
+    std::string settings = "\n" + extra + "\n";
+    auto addKey = [&settings](const std::string& section, const std::string& line) {
+        const std::string header = "\n[" + section + "]\n";
+        const std::size_t at = settings.find(header);
+        if (at == std::string::npos) {
+            settings += header + line + "\n";
+        } else {
+            settings.insert(at + header.size(), line + "\n");
+        }
+    };
+    addKey("PATHS", "DLL=" + libraryDirectory + "/");
+    addKey("DEBUG", "MEMFILES=TRUE");
+    return settings;
 }
 
 } // namespace
 
-std::string SoundProgram(int count, int brickType)
+DialogFixture::DialogFixture()
 {
-    std::string text = "tobj 1 " + std::to_string(brickType) + " program\ntask 0\n";
-    for (int i = 0; i < count; ++i)
-        text += "cmd 20 04\n";
-    text += "end\n";
-    return text;
-}
-
-void DialogFixture::SetUp()
-{
-    dir_ = std::filesystem::temp_directory_path() / ("harbor-commands-" + std::to_string(getpid()) +
-                                                     "-" + std::to_string(NextDirectoryNumber()));
+    static int number = 0;
+    dir_ = std::filesystem::temp_directory_path() /
+           ("harbor-frame-" + std::to_string(getpid()) + "-" + std::to_string(++number));
     std::filesystem::remove_all(dir_);
     std::filesystem::create_directories(dir_);
-    ASSERT_NE(std::string(HARBOR_SIM_DIR), "") << "the simulated library is not built";
 }
 
-void DialogFixture::TearDown()
+DialogFixture::~DialogFixture()
 {
-    Stop();
-    // Every file the commands opened, result files posted by the library included, was given
-    // back by the time the session is gone.
-    EXPECT_EQ(workspace::LiveObjectCount(), 0);
     std::error_code ignored;
     std::filesystem::remove_all(dir_, ignored);
 }
 
-void DialogFixture::Start(const std::string& scenario, const std::string& ports,
-                          const std::string& options, const std::string& fileArgument)
+void DialogFixture::Construct(const std::string& settings, const std::string& fileArgument,
+                              const std::string& library)
 {
-    const std::string scenarioPath = WriteFile("scenario.txt", scenario);
-    ::setenv("TESSEL_SIM", scenarioPath.c_str(), 1);
-
-    std::string settings = "[PATHS]\nDLL=" + std::string(HARBOR_SIM_DIR) + "/\n";
-    settings += "[DEBUG]\nMEMFILES=TRUE\n";
-    settings += "[PORTS]\n" + ports + "\n";
-    settings += "[OPTIONS]\n" + options + "\n";
-    WriteFile("harbor.ini", settings);
-
+    ASSERT_FALSE(library.empty()) << "the library module is not built";
+    ::setenv("TESSEL_SIM", WriteFile("scenario.sim", scenario_).c_str(), 1);
+    WriteFile("harbor.ini", MergeSettings(settings, library));
     host_ = std::make_unique<ui::HeadlessHost>();
-    host_->FixTickCount(1000);
+    host_->FixTickCount(500);
     host_->SetListener([this](const ui::HeadlessEvent& event) {
         events_.push_back(event);
         if (extra_)
             extra_(event);
     });
-
-    std::string commandLine = "\"" + (dir_ / "harbor.exe").string() + "\"";
+    std::string commandLine = "\"" + (dir_ / "harbor").string() + "\"";
     if (!fileArgument.empty())
         commandLine += " " + fileArgument;
     dialog_ = std::make_unique<ui::TestClientDialog>(*host_, commandLine.c_str());
-    ASSERT_NE(dialog_->session(), nullptr);
-    ASSERT_TRUE(dialog_->session()->libraryLoaded()) << "Tessel.dll not found in " HARBOR_SIM_DIR;
+}
+
+void DialogFixture::Open(const std::string& settings, const std::string& fileArgument,
+                         const std::string& library)
+{
+    ASSERT_NO_FATAL_FAILURE(Construct(settings, fileArgument, library));
+    ASSERT_TRUE(dialog_->session()->libraryLoaded()) << "no library in " << library;
     ASSERT_TRUE(dialog_->Create());
 }
 
 void DialogFixture::Stop(bool settle)
 {
-    if (dialog_) {
-        if (settle && dialog_->handle() != ui::kNoWindow)
+    if (dialog_ && dialog_->handle() != ui::kNoWindow) {
+        if (settle)
             Settle();
-        dialog_.reset();
+        host_->SendMessage(dialog_->handle(), ui::kMsgCommand, ui::MakeCommand(ui::IdFileExit), 0);
     }
     extra_ = nullptr;
+    dialog_.reset();
     host_.reset();
+}
+
+void DialogFixture::TearDown()
+{
+    Stop(settleOnTearDown_);
+    // Every file the commands opened, result files posted by the library included, was given
+    // back by the time the session is gone.
+    EXPECT_EQ(workspace::LiveObjectCount(), 0);
 }
 
 void DialogFixture::Settle()
@@ -128,6 +156,16 @@ void DialogFixture::Pump(const std::function<bool()>& done, const char* hang)
     }
 }
 
+std::vector<ui::HeadlessEvent> DialogFixture::EventsOf(ui::HeadlessEvent::Kind kind) const
+{
+    std::vector<ui::HeadlessEvent> result;
+    for (const auto& event : events_) {
+        if (event.kind == kind)
+            result.push_back(event);
+    }
+    return result;
+}
+
 std::vector<std::string> DialogFixture::Statuses() const
 {
     std::vector<std::string> texts;
@@ -142,32 +180,21 @@ std::string DialogFixture::LastStatus() const
     return texts.empty() ? std::string("<no status shown>") : texts.back();
 }
 
-std::vector<ui::HeadlessEvent> DialogFixture::EventsOf(ui::HeadlessEvent::Kind kind) const
-{
-    std::vector<ui::HeadlessEvent> found;
-    for (const ui::HeadlessEvent& event : events_) {
-        if (event.kind == kind)
-            found.push_back(event);
-    }
-    return found;
-}
-
-std::vector<std::string> DialogFixture::Offers() const
+std::vector<std::string> DialogFixture::Questions(const std::string& caption) const
 {
     std::vector<std::string> texts;
     for (const ui::HeadlessEvent& event : EventsOf(ui::HeadlessEvent::Kind::Question)) {
-        if (event.caption == "Diagnostics")
+        if (event.caption == caption)
             texts.push_back(event.text);
     }
     return texts;
 }
 
-std::string DialogFixture::WriteFile(const std::string& name, const std::string& bytes)
+std::string DialogFixture::WriteFile(const std::string& name, const std::string& bytes) const
 {
-    const std::filesystem::path path = dir_ / name;
-    std::ofstream out(path, std::ios::binary | std::ios::trunc);
-    out.write(bytes.data(), static_cast<std::streamsize>(bytes.size()));
-    return path.string();
+    const std::filesystem::path file = dir_ / name;
+    std::ofstream(file, std::ios::binary | std::ios::trunc) << bytes;
+    return file.string();
 }
 
 std::string DialogFixture::ReadFile(const std::filesystem::path& path)

@@ -1,9 +1,7 @@
-// The dialog on the headless host against the simulated library, as a test fixture.
-//
-// Each test writes a scenario for the simulator and a settings file into a directory of its
-// own, constructs the dialog with a command line whose program path lies in that directory
-// (so the settings file is found beside it), and drives it as a user would: clicking controls,
-// typing into edits, answering questions. Everything the user would see arrives as events.
+// The dialog on the headless host, built from a simulator scenario and a settings file of the
+// test's own: the command line's program path lies in a scratch directory, so the settings file
+// beside it is the test's. Everything the user would see arrives as events. Shared by the
+// command, headless and tool tests.
 #pragma once
 
 #include <gtest/gtest.h>
@@ -19,26 +17,42 @@
 
 namespace commands_test {
 
-// Scenario lines every test starts from: no simulated transmission time.
-inline constexpr const char* kFastLink = "link-time = 0\n";
+std::string SimulatorDirectory();
+std::string RecordingLibraryDirectory();
 
-// A program object with count sound commands in task 0, as the library's translation would
-// write it; downloaded as BIN source it is used without translation.
-std::string SoundProgram(int count, int brickType = 6);
+inline constexpr const char* kFastLink = "link-time = 0\n";
+// The simulator's default towers with no transmission time.
+inline constexpr const char* kFastScenario =
+    "link-time = 0\n[brick onyx2]\ntype = onyx2\n[port KIVOTOWER1]\nlong-range = yes\n"
+    "[port COM1]\n";
+
+// A program object with count sound commands in task 0, as the library's translation writes
+// it; downloaded as BIN source it is used without translation.
+std::string SoundProgram(int count);
 
 class DialogFixture : public ::testing::Test {
 protected:
-    void SetUp() override;
+    DialogFixture();
+    ~DialogFixture() override;
     void TearDown() override;
 
-    // Writes the scenario and the settings (the [PORTS] lines and the [OPTIONS] lines are
-    // given; the library's directory and memory files are always set), then constructs and
-    // creates the dialog. fileArgument is the command line's file, "" for none.
+    // Writes harbor.ini (library directory and memory files added to settings) and the
+    // scenario, then constructs the dialog; Open creates it too. fileArgument is the command
+    // line's file, "" for none.
+    void Construct(const std::string& settings, const std::string& fileArgument = "",
+                   const std::string& library = SimulatorDirectory());
+    void Open(const std::string& settings, const std::string& fileArgument = "",
+              const std::string& library = SimulatorDirectory());
+    // Opens the dialog on the simulator with this scenario, [PORTS] and [OPTIONS] lines.
     void Start(const std::string& scenario, const std::string& ports = "",
-               const std::string& options = "", const std::string& fileArgument = "");
-    // Destroys the dialog (and with it the session); the library is terminated. With settle,
-    // reports on their way are handled first, as the running program would.
+               const std::string& options = "", const std::string& fileArgument = "")
+    {
+        scenario_ = scenario;
+        Open("[PORTS]\n" + ports + "\n[OPTIONS]\n" + options + "\n", fileArgument);
+    }
+    // Closes the window as File/Exit does; with settle, reports on their way are handled first.
     void Stop(bool settle = true);
+    void SetScenario(const std::string& scenario) { scenario_ = scenario; }
 
     ui::TestClientDialog& dialog() { return *dialog_; }
     ui::HeadlessHost& host() { return *host_; }
@@ -57,32 +71,31 @@ protected:
     std::string Text(int id) { return host_->ControlText(window(), id); }
     void SelectSource(int index) { host_->ListSelect(window(), ui::IdSourceList, index); }
     void SelectBrick(int index) { host_->ListSelect(window(), ui::IdBrickList, index); }
-    void SetChecked(int id, bool checked) { host_->SetCheck(window(), id, checked); }
 
-    // Handles posted reports until no download or execution is in flight and nothing is
-    // queued. Fails the test when a report does not arrive within a generous bound (a hang).
+    // Handles posted reports until nothing is in flight or queued; fails on a hang.
     void Settle();
-    // Handles posted reports until count status texts satisfy accept, or fails as above.
+    // Handles posted reports until count status texts satisfy accept; fails on a hang.
     void WaitForStatuses(std::size_t count, bool (*accept)(const std::string&));
 
-    // Status box texts shown since the last ClearEvents, in order.
+    std::vector<ui::HeadlessEvent> EventsOf(ui::HeadlessEvent::Kind kind) const;
     std::vector<std::string> Statuses() const;
     std::string LastStatus() const;
-    std::vector<ui::HeadlessEvent> EventsOf(ui::HeadlessEvent::Kind kind) const;
-    // Questions of the Trouble Shooter offers ("Diagnostics").
-    std::vector<std::string> Offers() const;
+    // Texts of the questions with this caption; Offers are the Trouble Shooter's.
+    std::vector<std::string> Questions(const std::string& caption) const;
+    std::vector<std::string> Offers() const { return Questions("Diagnostics"); }
     void ClearEvents() { events_.clear(); }
     // Also called with every event, after it is recorded; null removes it.
     void OnEvent(std::function<void(const ui::HeadlessEvent&)> extra) { extra_ = std::move(extra); }
 
-    std::string WriteFile(const std::string& name, const std::string& bytes);
+    std::string WriteFile(const std::string& name, const std::string& bytes) const;
     static std::string ReadFile(const std::filesystem::path& path);
-
     // Property value read through the dialog's own session.
     std::int16_t Property(std::int16_t property);
 
+    // Recording-library tests leave operations that never report; they cannot settle.
+    bool settleOnTearDown_ = true;
+
 private:
-    // Handles posted reports until done; fails with hang when none arrives in a long while.
     void Pump(const std::function<bool()>& done, const char* hang);
 
     std::filesystem::path dir_;
@@ -90,6 +103,7 @@ private:
     std::unique_ptr<ui::TestClientDialog> dialog_;
     std::vector<ui::HeadlessEvent> events_;
     std::function<void(const ui::HeadlessEvent&)> extra_;
+    std::string scenario_ = kFastScenario;
 };
 
 } // namespace commands_test

@@ -14,7 +14,6 @@ class FileCommands : public DialogFixture {
 protected:
     void SetUp() override
     {
-        DialogFixture::SetUp();
         ASSERT_NO_FATAL_FAILURE(Start(std::string(kFastLink) + "[brick b1]\n[port COM1]\n"));
     }
     std::string Title() { return host().WindowTitle(window()); }
@@ -85,25 +84,22 @@ TEST_F(FileCommands, FilesAreWrittenBackByteForByte)
 TEST_F(FileCommands, TheTitleShowsTheLastComponentOfEitherSeparatorOfExactlyTheNameTyped)
 {
     SetText(ui::IdEditor, "text");
+    // A Windows-style name is a plain file name here; the title still cuts at the backslash.
+    // A bare name is written to the current directory, which is the test's own meanwhile.
     const std::pair<std::string, std::string> names[] = {
         {(dir() / "noextension").string(), "noextension"},
-        // A Windows-style name is a plain file name here; the title still cuts at the backslash.
         {(dir() / "C:\\work\\robot.onyx2").string(), "robot.onyx2"},
+        {"bare.onyx2", "bare.onyx2"},
     };
-    for (const auto& [path, shown] : names) {
-        Menu(ui::IdFileSaveAs, path);
-        EXPECT_EQ(ReadFile(path), "text");
-        EXPECT_EQ(Title(), kCaptionDash + shown);
-    }
-    EXPECT_FALSE(std::filesystem::exists(names[0].first + ".onyx2"));
-
-    // A bare name is written to the current directory, which is the test's own meanwhile.
     const std::filesystem::path previous = std::filesystem::current_path();
     std::filesystem::current_path(dir());
-    Menu(ui::IdFileSaveAs, "bare.onyx2");
+    for (const auto& [path, shown] : names) {
+        Menu(ui::IdFileSaveAs, path);
+        EXPECT_EQ(ReadFile(dir() / path), "text");
+        EXPECT_EQ(Title(), kCaptionDash + shown);
+    }
     std::filesystem::current_path(previous);
-    EXPECT_EQ(Title(), kCaptionDash + "bare.onyx2");
-    EXPECT_EQ(ReadFile(dir() / "bare.onyx2"), "text");
+    EXPECT_FALSE(std::filesystem::exists(names[0].first + ".onyx2"));
 }
 
 TEST_F(FileCommands, ANameThatCannotBeWrittenIsTakenButOneTooLongIsRefused)
@@ -127,16 +123,6 @@ TEST_F(FileCommands, ANameThatCannotBeWrittenIsTakenButOneTooLongIsRefused)
     EXPECT_EQ(LastStatus(), "File name too long: " + longName);
     // Nothing was written, under the full name or under one cut to 259 characters.
     EXPECT_TRUE(std::filesystem::is_empty(deep));
-}
-
-TEST_F(FileCommands, AStartUpFileIsLoadedAndNamedInTheTitle)
-{
-    const std::string path = WriteFile("start.onyx2", "start text");
-    Stop();
-    ASSERT_NO_FATAL_FAILURE(
-        Start(std::string(kFastLink) + "[brick b1]\n[port COM1]\n", "", "", path));
-    EXPECT_EQ(Text(ui::IdEditor), "start text");
-    EXPECT_EQ(Title(), kCaptionDash + "start.onyx2");
 }
 
 } // namespace

@@ -8,8 +8,6 @@
 namespace commands_test {
 namespace {
 
-using ui::HeadlessEvent;
-
 std::string SerialPorts(int count, const std::string& brickLines = "type = onyx2\n")
 {
     std::string text = std::string(kFastLink) + "[brick b1]\n" + brickLines;
@@ -20,15 +18,6 @@ std::string SerialPorts(int count, const std::string& brickLines = "type = onyx2
 
 class PortCommands : public DialogFixture {
 protected:
-    std::vector<std::string> PortQuestions() const
-    {
-        std::vector<std::string> found;
-        for (const HeadlessEvent& event : EventsOf(HeadlessEvent::Kind::Question)) {
-            if (event.caption == "Select Port")
-                found.push_back(event.text);
-        }
-        return found;
-    }
     void ExpectRanges(bool shortAndMedium, bool longRange)
     {
         EXPECT_EQ(host().IsControlEnabled(window(), ui::IdRangeShort), shortAndMedium);
@@ -52,7 +41,7 @@ TEST_F(PortCommands, ASerialPortFromUnopenedToClosedTwice)
     EXPECT_TRUE(Statuses().empty());
 
     Click(ui::IdOpenPort); // the one port found is opened without a question
-    EXPECT_TRUE(PortQuestions().empty());
+    EXPECT_TRUE(Questions("Select Port").empty());
     EXPECT_EQ(LastStatus(), "Opened COM1, Onyx2 brick");
     EXPECT_EQ(dialog().portType(), tessel::PortSerialIr);
     ExpectRanges(false, false); // a serial tower has no range to set
@@ -75,7 +64,7 @@ TEST_F(PortCommands, PortsAreOfferedInOrderUntilTheFirstYes)
     host().QueueAnswer(false);
     host().QueueAnswer(true);
     Click(ui::IdOpenPort);
-    EXPECT_EQ(PortQuestions(), (std::vector<std::string>{"COM1", "COM2"}));
+    EXPECT_EQ(Questions("Select Port"), (std::vector<std::string>{"COM1", "COM2"}));
     EXPECT_EQ(LastStatus(), "Opened COM2, Onyx2 brick");
 }
 
@@ -86,7 +75,7 @@ TEST_F(PortCommands, OnlyTenPortsAreOfferedAndTheOldHandleGoesEvenWhenNoneIsChos
     ASSERT_NE(old, 0);
     Click(ui::IdOpenPort); // every question answered No
 
-    const std::vector<std::string> asked = PortQuestions();
+    const std::vector<std::string> asked = Questions("Select Port");
     ASSERT_EQ(asked.size(), 10u);
     EXPECT_EQ(asked[9], "COM10");
     EXPECT_EQ(LastStatus(), "No port selected");

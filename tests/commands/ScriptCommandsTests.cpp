@@ -190,14 +190,14 @@ TEST_F(ScriptCommands, AutoClearRunsFirstAndAFailureStopsBeforeTranslating)
     // Every packet to the brick is lost, so clearing it fails; the script is wrong too, but
     // its error must not appear: nothing is translated after the failed clear.
     ASSERT_NO_FATAL_FAILURE(StartOpen("loss = 100\n"));
-    SetChecked(ui::IdAutoClear, true);
+    host().SetCheck(window(), ui::IdAutoClear, true);
     SetText(ui::IdEditor, "program P {\n    main {\n        speed = 2\n    }\n}\n");
     Click(ui::IdDownload);
     Settle();
     EXPECT_EQ(Statuses(), (Texts{"", "Error (0xe1000204) from Wisp: Retry count exceeded"}));
 
     // Without Auto Clear the same download reaches the translation.
-    SetChecked(ui::IdAutoClear, false);
+    host().SetCheck(window(), ui::IdAutoClear, false);
     Click(ui::IdDownload);
     Settle();
     EXPECT_EQ(LastStatus(), kUndeclared);

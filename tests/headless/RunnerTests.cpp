@@ -4,21 +4,21 @@
 #include <sstream>
 #include <string>
 
-#include "FrameFixture.h"
+#include "DialogFixture.h"
 #include "testlib/TestSupport.h"
 #include "ui/headless/HeadlessRunner.h"
 
 using namespace ui;
-using headless_test::FrameFixture;
+using commands_test::DialogFixture;
 
 namespace {
 
-class RunnerTest : public FrameFixture {
+class RunnerTest : public DialogFixture {
 protected:
     // Runs script on a dialog built from settings; keeps the transcript and the messages.
     int Run(const std::string& script, const std::string& settings = "",
             HeadlessOptions options = {}, const std::string& fileArgument = "",
-            const std::string& library = headless_test::SimulatorDirectory())
+            const std::string& library = commands_test::SimulatorDirectory())
     {
         Construct(settings, fileArgument, library);
         std::istringstream in(script);
@@ -145,16 +145,16 @@ TEST_F(RunnerTest, HelpSessionTakesTheFollowingCommandsAndEndOfInputClosesIt)
 
 TEST_F(RunnerTest, AnOperationGivenUpOnIsNotWaitedForAgain)
 {
-    if (headless_test::RecordingLibraryDirectory().empty())
+    if (commands_test::RecordingLibraryDirectory().empty())
         GTEST_SKIP() << "no testlib";
     // The recording library accepts the download and never reports back.
-    testsupport::RecordingLibrary library(headless_test::RecordingLibraryDirectory() + "/");
+    testsupport::RecordingLibrary library(commands_test::RecordingLibraryDirectory() + "/");
     ASSERT_TRUE(library.loaded());
     library.state().results[tessel::SlotCreate] = 3;
     HeadlessOptions options;
     options.waitTimeoutMs = 50;
     EXPECT_EQ(Run("Editor a\nDownload\nEditor b\nEditor c\n", "[PORTS]\nUSB=T\n", options, "",
-                  headless_test::RecordingLibraryDirectory()),
+                  commands_test::RecordingLibraryDirectory()),
               HeadlessFailed);
     const std::string text = out.str();
     const auto first = text.find("wait: timed out");
