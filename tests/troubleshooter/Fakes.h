@@ -19,6 +19,12 @@
 
 using Strings = std::vector<std::string>;
 
+inline std::string HelpDirectory()
+{
+    const std::string file = HARBOR_HELP_FILE;
+    return file.substr(0, file.rfind('/') + 1);
+}
+
 constexpr std::int32_t Packed(std::uint32_t value)
 {
     return static_cast<std::int32_t>(value);
@@ -50,7 +56,7 @@ public:
 
     tessel::Long FindPort(char* name, tessel::Size size) override
     {
-        Record("FindPort(" + std::string(name) + ")");
+        Record("FindPort", name);
         if (findPortAnswers.empty()) {
             return Packed(0xE0050444u);
         }
@@ -61,17 +67,17 @@ public:
     }
     tessel::Long Create(const char* port) override
     {
-        Record("Create(" + std::string(port) + ")");
+        Record("Create", port);
         return createHandle;
     }
     int Destroy(tessel::Long hBrick) override
     {
-        Record("Destroy(" + std::to_string(hBrick) + ")");
+        Record("Destroy", hBrick);
         return 1;
     }
     tessel::Long Status(tessel::Long hBrick, tessel::Short what, char*, tessel::Size) override
     {
-        Record("Status(" + std::to_string(hBrick) + "," + std::to_string(what) + ")");
+        Record("Status", hBrick, what);
         auto& queue = statusAnswers[what];
         if (queue.empty()) {
             return lastStatus[what];
@@ -82,14 +88,13 @@ public:
     }
     tessel::Long Set(tessel::Long hBrick, tessel::Short property, tessel::Short value) override
     {
-        Record("Set(" + std::to_string(hBrick) + "," + std::to_string(property) + "," +
-               std::to_string(value) + ")");
+        Record("Set", hBrick, property, value);
         return setResult;
     }
     tessel::Long Get(tessel::Long hBrick, tessel::Short property, tessel::Short* value, char* text,
                      tessel::Size size) override
     {
-        Record("Get(" + std::to_string(hBrick) + "," + std::to_string(property) + ")");
+        Record("Get", hBrick, property);
         const bool port = property == tessel::PropPort;
         const tessel::Long result = port ? getPortResult : getBrickTypeResult;
         if (result >= 0) {
@@ -103,26 +108,32 @@ public:
     tessel::Long FindFirst(tessel::Short type, tessel::Short* item, char* name,
                            tessel::Size size) override
     {
-        Record("FindFirst(" + std::to_string(type) + ")");
+        Record("FindFirst", type);
         return NextItem(type, item, name, size);
     }
     tessel::Long FindNext(tessel::Short type, tessel::Short* item, char* name,
                           tessel::Size size) override
     {
-        Record("FindNext(" + std::to_string(type) + ")");
+        Record("FindNext", type);
         return NextItem(type, item, name, size);
     }
     tessel::Long RunImmediate(tessel::Long hBrick, const char* text, tessel::Long*) override
     {
-        Record("RunImmediate(" + std::to_string(hBrick) + "," + text + ")");
+        Record("RunImmediate", hBrick, text);
         return runResult;
     }
 
 private:
-    void Record(const std::string& call)
+    // Records "Name(arg,arg)".
+    template <typename... Args> void Record(const char* name, const Args&... args)
     {
-        EXPECT_FALSE(forbidCalls) << "forbidden call " << call;
-        calls.push_back(call);
+        std::ostringstream call;
+        const char* separator = "";
+        call << name << '(';
+        ((call << separator << args, separator = ","), ...);
+        call << ')';
+        EXPECT_FALSE(forbidCalls) << "forbidden call " << call.str();
+        calls.push_back(call.str());
     }
     tessel::Long NextItem(tessel::Short type, tessel::Short* item, char* name, tessel::Size size)
     {
@@ -143,15 +154,11 @@ private:
 // A log file path of each test's own, removed before and after.
 class TempLog {
 public:
-    explicit TempLog(const std::string& tag = "")
+    TempLog()
     {
         const auto* info = testing::UnitTest::GetInstance()->current_test_info();
-        std::string leaf = "harbor_ts_" + std::to_string(getpid()) + "_" +
-                           info->test_suite_name() + "_" + info->name() + tag + ".log";
-        for (char& c : leaf) {
-            c = c == '/' ? '_' : c;
-        }
-        path_ = testing::TempDir() + leaf;
+        path_ = testing::TempDir() + "harbor_ts_" + std::to_string(getpid()) + "_" +
+                info->test_suite_name() + "_" + info->name() + ".log";
         std::remove(path_.c_str());
     }
     ~TempLog() { std::remove(path_.c_str()); }

@@ -2,14 +2,15 @@
 // commands running tests whose results open the next topic.
 #include <gtest/gtest.h>
 
+#include <deque>
 #include <string>
 #include <vector>
 
-#include "FakeWindowHost.h"
 #include "Fakes.h"
 #include "platform/SystemInfoScripted.h"
 #include "troubleshooter/HelpLink.h"
 #include "troubleshooter/TroubleShooter.h"
+#include "ui/headless/HeadlessHost.h"
 
 namespace {
 
@@ -20,11 +21,23 @@ std::string Jump(const char* topic)
 
 class HelpProtocol : public testing::Test {
 protected:
-    // The help file sends a command, as a link of the shown topic would.
-    void Send(int id, ui::LParam argument = 0)
+    HelpProtocol()
     {
-        host.whenIdle.push_back([this, id, argument] {
-            host.PostMessage(viewer.lastOwner, ui::kMsgCommand, ui::MakeCommand(id), argument);
+        host.SetListener([](const ui::HeadlessEvent& event) {
+            ADD_FAILURE() << "the help link shows nothing itself: " << event.text;
+        });
+        // A dry queue runs the help's next scripted command, as a link of the shown topic
+        // would send it; with none left the quit request ends a faulty run.
+        host.SetIdleHandler([this] {
+            ++idleCalls;
+            if (script.empty()) {
+                host.PostQuit(0);
+            } else {
+                host.PostMessage(viewer.lastOwner, ui::kMsgCommand,
+                                 ui::MakeCommand(script.front().first), script.front().second);
+                script.pop_front();
+            }
+            return true;
         });
     }
 
@@ -32,35 +45,31 @@ protected:
     FakeBrickCalls calls;
     platform::ScriptedSystemInfo system;
     tessel::Long handle = 5;
-    FakeWindowHost host;
+    ui::HeadlessHost host;
     RecordingViewer viewer;
     TroubleShooter shooter{&calls, &handle, log.path(), &system};
+    std::deque<std::pair<int, ui::LParam>> script;
+    int idleCalls = 0;
 };
 
-TEST_F(HelpProtocol, LinkOwnsOneHiddenWindowAndClosesAnOpenHelpWhenItGoes)
+TEST_F(HelpProtocol, HiddenWindowOpensTheFileOnceShowsTopicsAndClosesTheHelpWhenItGoes)
 {
+    ui::WindowHandle window = ui::kNoWindow;
     {
         HelpLink link(&shooter, host, &viewer);
-        ASSERT_NE(link.window(), ui::kNoWindow);
-        EXPECT_EQ(host.windows.at(link.window()).first, "trbl_wnd");
+        window = link.window();
+        EXPECT_EQ(host.FindWindowOfClass("trbl_wnd"), window);
+        EXPECT_FALSE(host.WindowVisible(window));
         EXPECT_FALSE(link.HelpOpen());
-        link.ShowOutcome(1001);
+        EXPECT_FALSE(link.ShowOutcome(1310)) << "no topic, but the help opens";
+        EXPECT_TRUE(link.HelpOpen());
+        EXPECT_TRUE(link.ShowOutcome(1011));
+        EXPECT_TRUE(link.ShowOutcome(1203));
+        EXPECT_EQ(viewer.lastOwner, window);
     }
-    EXPECT_TRUE(host.windows.empty());
-    EXPECT_EQ(host.destroyed, 1);
-    EXPECT_EQ(viewer.calls.back(), "quit shooter.hlp");
-}
-
-TEST_F(HelpProtocol, ShowOutcomeOpensTheFileOnceAndShowsTheTopic)
-{
-    HelpLink link(&shooter, host, &viewer);
-    EXPECT_FALSE(link.ShowOutcome(1310)) << "no topic, but the help opens";
-    EXPECT_TRUE(link.HelpOpen());
-    EXPECT_TRUE(link.ShowOutcome(1011));
-    EXPECT_TRUE(link.ShowOutcome(1203));
+    EXPECT_FALSE(host.WindowExists(window));
     EXPECT_EQ(viewer.calls, (Strings{"open shooter.hlp", "macro " + Jump("Download_interrupted"),
-                                     "macro " + Jump("COM_port_invalid")}));
-    EXPECT_EQ(viewer.lastOwner, link.window());
+                                     "macro " + Jump("COM_port_invalid"), "quit shooter.hlp"}));
 }
 
 TEST_F(HelpProtocol, OnlyAnAnswerOfExactlyOneOpensTheHelp)
@@ -143,29 +152,27 @@ TEST_F(HelpProtocol, EachTestOpensItsSuccessTopic)
 TEST_F(HelpProtocol, PortTypeCommandDecidesTheNextNoMoreItemsJump)
 {
     HelpLink link(&shooter, host, &viewer);
-    Send(3001, 3);
-    Send(2007); // no COM port: ends with library code 82
-    Send(2000);
+    script = {{3001, 3}, {2007, 0}, {2000, 0}}; // no COM port: 2007 ends with library code 82
     EXPECT_TRUE(shooter.Diagnose(Packed(0xE0050421u), &link));
     EXPECT_EQ(viewer.Macros(), (Strings{Jump("IR_Transmitter_or_cable_not_connected"),
                                         Jump("USB_Transmitter_not_installed")}));
     EXPECT_EQ(shooter.portType(), 3);
     EXPECT_FALSE(link.HelpOpen());
     EXPECT_EQ(viewer.calls.back(), "quit shooter.hlp");
-    EXPECT_FALSE(host.quit);
+    EXPECT_FALSE(host.QuitRequested());
 }
 
 TEST_F(HelpProtocol, FailedTestJumpsToItsOwnOutcomeAndCloseEndsThePump)
 {
     HelpLink link(&shooter, host, &viewer);
     calls.lastStatus[3] = 4; // the brick's status: no tower
-    Send(2003);
-    Send(2000);
+    script = {{2003, 0}, {2000, 0}};
     EXPECT_TRUE(shooter.Diagnose(Packed(0xE0050402u), &link));
     EXPECT_EQ(viewer.calls, (Strings{"open shooter.hlp", "macro " + Jump("Onyx_not_alive"),
                                      "macro " + Jump("IR_Transmitter_or_cable_not_connected"),
                                      "quit shooter.hlp"}));
-    EXPECT_EQ(host.pumps, 2);
+    EXPECT_EQ(idleCalls, 2);
+    EXPECT_FALSE(host.QuitRequested());
 }
 
 TEST_F(HelpProtocol, RepairedUsbTowerLetsTheArgumentStand)
@@ -175,9 +182,7 @@ TEST_F(HelpProtocol, RepairedUsbTowerLetsTheArgumentStand)
     // Answering at the diagnosis, lost before each of the two commands, found again by each.
     calls.statusAnswers[2] = {1, 4, 1, 4, 1};
     calls.findPortAnswers = {{0, "KIVOTOWER"}, {0, "KIVOTOWER"}};
-    Send(2001, 0);
-    Send(2008, Packed(0xE0050413u));
-    Send(2000);
+    script = {{2001, 0}, {2008, Packed(0xE0050413u)}, {2000, 0}};
     shooter.Diagnose(Packed(0xE0050401u), &link);
     EXPECT_EQ(viewer.Macros(),
               (Strings{Jump("IR_Transmitter_not_found"), Jump("Found_working_IR_Transmitter"),
@@ -204,44 +209,24 @@ TEST_F(HelpProtocol, UnknownCommandsAndCommandsWithoutTroubleShooterDoNothing)
     EXPECT_FALSE(orphan.HelpOpen()) << "only close acts";
 }
 
-TEST_F(HelpProtocol, CommandMessagesReachTheLinkThroughItsWindow)
-{
-    HelpLink link(&shooter, host, &viewer);
-    link.ShowOutcome(1001);
-    EXPECT_EQ(host.SendMessage(link.window(), ui::kMsgCommand, ui::MakeCommand(2000, 1), 0), 0);
-    EXPECT_FALSE(link.HelpOpen());
-    EXPECT_EQ(host.SendMessage(link.window(), 0x0200, 0, 0), 0) << "others: default processing";
-}
-
 TEST_F(HelpProtocol, QuitRequestEndsTheRunAndStaysPending)
 {
     HelpLink link(&shooter, host, &viewer);
-    host.whenIdle.push_back([this] { host.PostQuit(0); });
     EXPECT_TRUE(shooter.Diagnose(Packed(0xE0050401u), &link));
     EXPECT_FALSE(link.HelpOpen());
-    EXPECT_TRUE(host.quit);
+    EXPECT_TRUE(host.QuitRequested());
     EXPECT_EQ(viewer.calls.back(), "quit shooter.hlp");
 }
 
-TEST_F(HelpProtocol, MissingHelpFileOrWindowEndsTheRunAtOnce)
+TEST_F(HelpProtocol, MissingHelpFileEndsTheRunAtOnceWithTheDiagnosisLogged)
 {
     viewer.openAnswer = 0;
     HelpLink link(&shooter, host, &viewer);
     EXPECT_TRUE(shooter.Diagnose(Packed(0xE0050421u), &link));
-    EXPECT_EQ(host.pumps, 0);
+    EXPECT_EQ(idleCalls, 0);
     shooter.CloseLog();
     EXPECT_NE(log.body().find("\tDiagnosing Error failed:\n"), std::string::npos);
     EXPECT_NE(log.body().find("\nTrouble Shooter closed\n"), std::string::npos);
-
-    host.refuseWindows = true;
-    RecordingViewer unowned;
-    HelpLink windowless(&shooter, host, &unowned);
-    EXPECT_EQ(windowless.window(), ui::kNoWindow);
-    EXPECT_TRUE(shooter.Diagnose(Packed(0xE0050421u), &windowless));
-    EXPECT_FALSE(windowless.HelpOpen());
-    EXPECT_EQ(host.pumps, 0);
-    EXPECT_EQ(unowned.Macros(), Strings{Jump("IR_Transmitter_or_cable_not_connected")});
-    EXPECT_NE(unowned.calls.front().rfind("open", 0), 0u) << "no file opened without a window";
 }
 
 } // namespace

@@ -16,12 +16,6 @@
 
 namespace {
 
-std::string HelpDirectory()
-{
-    const std::string file = HARBOR_HELP_FILE;
-    return file.substr(0, file.rfind('/') + 1);
-}
-
 // A "link" that starts a second run with its argument as the error.
 constexpr int kNestedRun = -1;
 
@@ -38,9 +32,7 @@ protected:
     void StartDialog(const std::string& scenario, const std::string& ports,
                      const std::string& helpDirectory = HelpDirectory())
     {
-        ::setenv("TESSEL_SIM", WriteFile("scenario.txt", "link-time = 0\n" + scenario).c_str(), 1);
-        WriteFile("harbor.ini",
-                  SettingsText() + "LOGFILE=" + LogPath() + "\n[PORTS]\n" + ports + "\n");
+        WriteScenario(scenario, "LOGFILE=" + LogPath() + "\n[PORTS]\n" + ports + "\n");
         host_ = std::make_unique<ui::HeadlessHost>();
         host_->SetListener([this](const ui::HeadlessEvent& event) {
             if (event.kind == ui::HeadlessEvent::Kind::Question) {

@@ -113,40 +113,6 @@ TEST_F(SimulatedDiagnosis, OutcomeEdgeCases)
     }
 }
 
-TEST_F(SimulatedDiagnosis, RepairFindsTheUnpluggedTowerWithoutLog)
-{
-    Start("[brick onyx2]\n[port KIVOTOWER1]\nunplug-after = 1\n");
-    sessionSlot_ = session_.get();
-    handle = session().Create("KIVOTOWER1");
-    EXPECT_EQ(session().RunImmediate(handle, "sound 4", nullptr), 0);
-    EXPECT_EQ(session().RunImmediate(handle, "sound 4", nullptr), Packed(0xE0050474u));
-    SessionBrickCalls adapter(&sessionSlot_);
-    TroubleShooter quiet(&adapter, &handle, nullptr, &system);
-    EXPECT_TRUE(quiet.RepairUsbTower(3));
-    EXPECT_EQ(session().RunImmediate(handle, "sound 4", nullptr), 0);
-    quiet.CloseLog();
-    EXPECT_FALSE(std::filesystem::exists(LogPath()));
-    session().Destroy(handle);
-}
-
-TEST_F(SimulatedDiagnosis, TestsReachTheSimulatedHardware)
-{
-    Start("[brick onyx2]\n[port KIVOTOWER1]\n[port COM1]\n[port COM2]\nstate = in-use\n"
-          "[port COM3]\n");
-    Open("KIVOTOWER1");
-    EXPECT_EQ(shooter->TestTower(), 0);
-    EXPECT_EQ(shooter->TestBrick(), 0);
-    EXPECT_EQ(shooter->SetUsbRange(2), 0);
-    EXPECT_EQ(shooter->TestSerialPort(2), Packed(0xE0050450u));
-    EXPECT_EQ(handle, 0);
-    EXPECT_EQ(shooter->TestSerialPort(3), 0);
-    EXPECT_EQ(shooter->FindUsbTower(), 0);
-    EXPECT_EQ(shooter->TestSerialPort(7), Packed(0xE0050C52u));
-    EXPECT_NE(Body().find("\tTest COM port COM3: failed:\n\t\tError (0xe0050c52) from Tessel tsl: "
-                          "no more items found\n"),
-              std::string::npos);
-}
-
 TEST_F(SimulatedDiagnosis, CallsAfterTheSessionIsGoneFailQuietly)
 {
     Start("[brick onyx2]\n[port COM1]\n");

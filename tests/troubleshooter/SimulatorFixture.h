@@ -38,18 +38,18 @@ protected:
         std::filesystem::remove_all(dir_, ignored);
     }
 
-    // Writes the scenario (link time 0 is added) and the settings, and starts the session.
-    void Start(const std::string& scenario)
+    // Writes the scenario (link time 0 is added) and the settings, with lines of the test's own.
+    void WriteScenario(const std::string& scenario, const std::string& settings = "")
     {
         ::setenv("TESSEL_SIM", WriteFile("scenario.txt", "link-time = 0\n" + scenario).c_str(), 1);
-        WriteFile("harbor.ini", SettingsText());
+        WriteFile("harbor.ini", "[PATHS]\nDLL=" + std::string(HARBOR_SIM_DIR) +
+                                    "/\n[DEBUG]\nMEMFILES=TRUE\n" + settings);
+    }
+    void Start(const std::string& scenario)
+    {
+        WriteScenario(scenario);
         session_ = std::make_unique<BrickSession>((dir_ / "harbor.ini").string().c_str());
         ASSERT_TRUE(session_->libraryLoaded()) << "Tessel.dll not found in " HARBOR_SIM_DIR;
-    }
-
-    static std::string SettingsText()
-    {
-        return "[PATHS]\nDLL=" + std::string(HARBOR_SIM_DIR) + "/\n[DEBUG]\nMEMFILES=TRUE\n";
     }
     std::string LogPath() const { return (dir_ / "shooter.log").string(); }
     std::string Log() const
