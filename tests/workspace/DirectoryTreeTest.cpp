@@ -14,7 +14,6 @@
 
 namespace {
 
-using workspace_test::DescribeTree;
 using workspace_test::PathOf;
 using workspace_test::WorkspaceTest;
 
@@ -30,7 +29,7 @@ protected:
     void TearDown() override
     {
         if (top_ != nullptr) {
-            EXPECT_EQ(top_->release(), nullptr) << DescribeTree(top_);
+            EXPECT_EQ(top_->release(), nullptr);
         }
         WorkspaceTest::TearDown();
     }
@@ -393,7 +392,7 @@ TEST_F(DirectoryTree, CopyMakesNewDirectoriesAndClonesFilesSharingTheirContent)
 
     EXPECT_EQ(names(dst), names(src));
     DirEnt* copied = dst->find("Script/source.txt");
-    ASSERT_NE(copied, nullptr) << DescribeTree(top_);
+    ASSERT_NE(copied, nullptr);
     EXPECT_NE(copied, source);
     EXPECT_NE(dst->find("Script"), src->find("Script"));
     EXPECT_NE(dst->find("Script/Temp/obj.bin"), nullptr);

@@ -13,6 +13,7 @@
 namespace {
 
 namespace fs = std::filesystem;
+using workspace_test::Take;
 using workspace_test::WorkspaceTest;
 
 class DiskFile : public WorkspaceTest {
@@ -48,14 +49,6 @@ protected:
         return (new DiskEntry(path.c_str()))->open(4);
     }
     ReaderWriter* openHandle(const char* name) const { return openHandle(hostPath(name)); }
-
-    static std::string take(ReaderWriter* handle, std::int32_t count)
-    {
-        std::string bytes(static_cast<std::size_t>(count), '\0');
-        const std::int32_t got = handle->read(bytes.data(), count);
-        bytes.resize(static_cast<std::size_t>(got > 0 ? got : 0));
-        return bytes;
-    }
 
     fs::path folder_;
 };
@@ -103,7 +96,7 @@ TEST_F(DiskFile, HandleThatCannotOpenSaysSoInEveryOperation)
     EXPECT_EQ(readHost("plain.txt"), "abc");
     ReaderWriter* handle = openHandle("plain.txt");
     EXPECT_EQ(handle->open("rbbbbbbbbbbbbb"), RwOk) << "14 letters fit";
-    EXPECT_EQ(take(handle, 10), "abc");
+    EXPECT_EQ(Take(handle, 10), "abc");
     handle->release();
 }
 
@@ -120,8 +113,8 @@ TEST_F(DiskFile, BytesPassUnchangedAndWriteEmptiesWhileAppendKeeps)
     EXPECT_EQ(handle->close(), RwNotOpen) << "the second close is reported";
     EXPECT_EQ(readHost("data.bin"), binary);
     ASSERT_EQ(handle->openRead(), RwOk);
-    EXPECT_EQ(take(handle, 100), binary);
-    EXPECT_EQ(take(handle, 100), "") << "past the end";
+    EXPECT_EQ(Take(handle, 100), binary);
+    EXPECT_EQ(Take(handle, 100), "") << "past the end";
 
     writeHost("data.bin", "head");
     EXPECT_EQ(handle->open("a"), RwOk);
@@ -157,9 +150,9 @@ TEST_F(DiskFile, ReadAndWriteMayAlternateOnAnUpdateStream)
     writeHost("update.txt", "abcdef");
     ReaderWriter* handle = openHandle("update.txt");
     ASSERT_EQ(handle->open("r+"), RwOk);
-    EXPECT_EQ(take(handle, 2), "ab");
+    EXPECT_EQ(Take(handle, 2), "ab");
     EXPECT_EQ(handle->write("XY", 2), 2);
-    EXPECT_EQ(take(handle, 2), "ef");
+    EXPECT_EQ(Take(handle, 2), "ef");
     handle->close();
     EXPECT_EQ(readHost("update.txt"), "abXYef");
     handle->release();
@@ -172,7 +165,7 @@ TEST_F(DiskFile, ReopeningOrReleasingClosesTheEarlierStreamFirst)
     EXPECT_EQ(handle->write("abc", 3), 3);
     // The bytes sit in the first stream's buffer; only closing that stream writes them out.
     ASSERT_EQ(handle->openRead(), RwOk);
-    EXPECT_EQ(take(handle, 10), "abc");
+    EXPECT_EQ(Take(handle, 10), "abc");
     handle->release();
 
     ReaderWriter* unclosed = openHandle("flushed.txt");
@@ -197,7 +190,7 @@ TEST_F(DiskFile, CloneNamesTheSameHostFileWithItsOwnCopy)
     first->write("via first", 9);
     first->close();
     ASSERT_EQ(second->openRead(), RwOk);
-    EXPECT_EQ(take(second, 20), "via first");
+    EXPECT_EQ(Take(second, 20), "via first");
     second->release();
     first->release();
 }

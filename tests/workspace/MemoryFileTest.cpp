@@ -13,6 +13,8 @@
 
 namespace {
 
+using workspace_test::Put;
+using workspace_test::Take;
 using workspace_test::WorkspaceTest;
 constexpr std::int32_t kMax = std::numeric_limits<std::int32_t>::max();
 constexpr std::int32_t kMin = std::numeric_limits<std::int32_t>::min();
@@ -43,17 +45,6 @@ protected:
         std::int32_t position = 0;
         static_cast<MemoryReaderWriter*>(handle)->block()->read(position, bytes.data(),
                                                                 handle->size());
-        return bytes;
-    }
-    static std::int32_t put(ReaderWriter* handle, const std::string& bytes)
-    {
-        return handle->write(bytes.data(), static_cast<std::int32_t>(bytes.size()));
-    }
-    static std::string take(ReaderWriter* handle, std::int32_t count)
-    {
-        std::string bytes(static_cast<std::size_t>(count > 0 ? count : 0), '\0');
-        const std::int32_t got = handle->read(bytes.data(), count);
-        bytes.resize(static_cast<std::size_t>(got > 0 ? got : 0));
         return bytes;
     }
 
@@ -131,24 +122,24 @@ TEST_F(MemoryFile, OpenModesTruncateAppendOrRewind)
     for (const Case& c : cases) {
         SCOPED_TRACE(c.mode != nullptr ? c.mode : "<null>");
         handle->openWrite();
-        put(handle, "hello");
+        Put(handle, "hello");
         handle->seek(3);
         EXPECT_EQ(handle->open(c.mode), RwOk);
         EXPECT_EQ(handle->tell(), c.position);
         EXPECT_EQ(handle->size(), c.size);
     }
-    put(handle, "abc");
+    Put(handle, "abc");
     EXPECT_EQ(handle->close(), RwOk);
     EXPECT_EQ(handle->tell(), 0) << "close only rewinds";
     EXPECT_EQ(handle->openRead(), RwOk);
-    EXPECT_EQ(take(handle, 10), "abc");
+    EXPECT_EQ(Take(handle, 10), "abc");
     EXPECT_EQ(handle->release(), nullptr);
 }
 
 TEST_F(MemoryFile, SeeksStayWithinTheData)
 {
     ReaderWriter* handle = entry_->open(0);
-    put(handle, "0123456789");
+    Put(handle, "0123456789");
     struct Case {
         bool relative;
         std::int32_t offset;
@@ -176,18 +167,18 @@ TEST_F(MemoryFile, SeeksStayWithinTheData)
 TEST_F(MemoryFile, SetSizeRefusesNegativeAndShorteningKeepsPositionAndHiddenBytes)
 {
     ReaderWriter* handle = entry_->open(0);
-    put(handle, "abcdef");
+    Put(handle, "abcdef");
     EXPECT_EQ(handle->setSize(-1), RwOutOfRange);
     EXPECT_EQ(stored(handle), "abcdef");
     EXPECT_EQ(handle->setSize(2), RwOk);
     EXPECT_EQ(handle->tell(), 6);
-    EXPECT_EQ(take(handle, 4), "");
+    EXPECT_EQ(Take(handle, 4), "");
     // Stepping back from past a shortened end is allowed; forward is not.
     EXPECT_EQ(handle->seekBy(1), RwOutOfRange);
     EXPECT_EQ(handle->seekBy(-1), RwOk);
     EXPECT_EQ(handle->tell(), 5);
     // Writing on from there brings the hidden bytes back, as the buffer kept them.
-    EXPECT_EQ(put(handle, "X"), 1);
+    EXPECT_EQ(Put(handle, "X"), 1);
     EXPECT_EQ(stored(handle), "abcdeX");
     handle->release();
 }
@@ -196,7 +187,7 @@ TEST_F(MemoryFile, CountsOfZeroOrLessTransferNothingOnEitherKind)
 {
     for (DirEnt* entry : {static_cast<DirEnt*>(entry_), static_cast<DirEnt*>(text_)}) {
         ReaderWriter* handle = entry->open(0);
-        put(handle, "a\nb");
+        Put(handle, "a\nb");
         handle->rewind();
         const std::string before = stored(handle);
         char buffer[2] = {'k', 'k'};
@@ -217,8 +208,8 @@ TEST_F(MemoryFile, HandlesAndClonesShareTheBytesWithOwnPositions)
 {
     ReaderWriter* first = entry_->open(1);
     ReaderWriter* second = entry_->open(2);
-    put(first, "shared");
-    EXPECT_EQ(take(second, 3), "sha");
+    Put(first, "shared");
+    EXPECT_EQ(Take(second, 3), "sha");
     EXPECT_EQ(first->tell(), 6);
 
     DirEnt* clone = entry_->clone();
@@ -227,15 +218,15 @@ TEST_F(MemoryFile, HandlesAndClonesShareTheBytesWithOwnPositions)
     clone->addRef();
     ReaderWriter* third = clone->open(3);
     EXPECT_EQ(dynamic_cast<TextMemoryReaderWriter*>(third), nullptr) << "binary stays binary";
-    EXPECT_EQ(take(third, 10), "shared");
-    put(third, "!");
+    EXPECT_EQ(Take(third, 10), "shared");
+    Put(third, "!");
     EXPECT_EQ(stored(first), "shared!");
     EXPECT_EQ(clone->release(), clone) << "the open handle keeps the clone";
     EXPECT_EQ(third->release(), nullptr);
     first->release();
     second->release();
     ReaderWriter* later = entry_->open(0);
-    EXPECT_EQ(take(later, 10), "shared!") << "the bytes outlive the clone they were written by";
+    EXPECT_EQ(Take(later, 10), "shared!") << "the bytes outlive the clone they were written by";
     later->release();
 
     DirEnt* textClone = text_->clone();
@@ -243,8 +234,8 @@ TEST_F(MemoryFile, HandlesAndClonesShareTheBytesWithOwnPositions)
     textClone->addRef();
     ReaderWriter* writer = text_->open(0);
     ReaderWriter* reader = textClone->open(0);
-    put(writer, "x\ny");
-    EXPECT_EQ(take(reader, 10), "x\ny");
+    Put(writer, "x\ny");
+    EXPECT_EQ(Take(reader, 10), "x\ny");
     reader->release();
     writer->release();
     EXPECT_EQ(textClone->release(), nullptr);
@@ -275,54 +266,21 @@ TEST_F(MemoryFile, TextStoresLfAsCrLfAndReadsItBack)
     for (const Case& c : cases) {
         SCOPED_TRACE(c.stored);
         handle->openWrite();
-        EXPECT_EQ(put(handle, c.written), static_cast<std::int32_t>(c.written.size()));
+        EXPECT_EQ(Put(handle, c.written), static_cast<std::int32_t>(c.written.size()));
         EXPECT_EQ(stored(handle), c.stored);
         EXPECT_EQ(handle->tell(), static_cast<std::int32_t>(c.stored.size()));
         handle->rewind();
-        EXPECT_EQ(take(handle, 10), c.read);
+        EXPECT_EQ(Take(handle, 10), c.read);
         binary->openWrite();
-        put(binary, c.written);
+        Put(binary, c.written);
         EXPECT_EQ(stored(binary), c.written) << "binary files keep every byte";
     }
     binary->release();
     // The position stays on the Ctrl-Z until the caller moves past it.
     EXPECT_EQ(handle->tell(), 2);
-    EXPECT_EQ(take(handle, 10), "");
+    EXPECT_EQ(Take(handle, 10), "");
     EXPECT_EQ(handle->seekBy(1), RwOk);
-    EXPECT_EQ(take(handle, 10), "cd");
-    handle->release();
-}
-
-TEST_F(MemoryFile, TextReadCountsCharactersAndPositionsCountStoredBytes)
-{
-    ReaderWriter* handle = text_->open(0);
-    put(handle, "a\n\nb\r");
-    handle->rewind();
-    std::string seen;
-    std::vector<std::int32_t> positions;
-    for (std::string one = take(handle, 1); !one.empty(); one = take(handle, 1)) {
-        seen += one;
-        positions.push_back(handle->tell());
-    }
-    EXPECT_EQ(seen, "a\n\nb\r");
-    EXPECT_EQ(positions, (std::vector<std::int32_t>{1, 3, 5, 6, 7}));
-
-    handle->openWrite();
-    put(handle, "\n\n\n\n");
-    handle->rewind();
-    char buffer[4] = {'k', 'k', 'k', 'k'};
-    EXPECT_EQ(handle->read(buffer, 3), 3);
-    EXPECT_EQ(std::string(buffer, 4), "\n\n\nk") << "no more than the count";
-    EXPECT_EQ(handle->tell(), 6);
-
-    handle->openWrite();
-    put(handle, "abcdef");
-    handle->seek(1);
-    EXPECT_EQ(put(handle, "\n"), 1);
-    EXPECT_EQ(stored(handle), "a\r\ndef") << "overwriting inside keeps the rest";
-    handle->seek(5);
-    EXPECT_EQ(put(handle, "\nZ"), 2);
-    EXPECT_EQ(stored(handle), "a\r\nde\r\nZ");
+    EXPECT_EQ(Take(handle, 10), "cd");
     handle->release();
 }
 
@@ -385,10 +343,10 @@ TEST_F(MemoryFile, TextAgreesWithTheByteWiseRulesOnRandomText)
             for (char& c : source) {
                 c = alphabet[random() % sizeof alphabet];
             }
-            ASSERT_EQ(put(handle, source), model.write(source));
+            ASSERT_EQ(Put(handle, source), model.write(source));
         } else if (action == 1) {
             const auto count = static_cast<std::int32_t>(random() % 40);
-            ASSERT_EQ(take(handle, count), model.read(count));
+            ASSERT_EQ(Take(handle, count), model.read(count));
         } else {
             const auto target = static_cast<std::int32_t>(random() % (model.stored.size() + 1));
             ASSERT_EQ(handle->seek(target), RwOk);
@@ -407,11 +365,11 @@ TEST_F(MemoryFile, LargeTextWriteGrowsToTheSameCapacityAsByteWiseGrowth)
     for (int i = 0; i < 1000; ++i) {
         source += "0123456789abcdef0123456789abcdef\n"; // 33 given, 34 stored
     }
-    ASSERT_EQ(put(handle, source), 33000);
+    ASSERT_EQ(Put(handle, source), 33000);
     EXPECT_EQ(handle->size(), 34000);
     EXPECT_EQ(static_cast<MemoryReaderWriter*>(handle)->block()->capacity(), 34816);
     handle->rewind();
-    EXPECT_EQ(take(handle, 40000), source);
+    EXPECT_EQ(Take(handle, 40000), source);
     handle->release();
 }
 

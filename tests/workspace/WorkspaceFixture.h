@@ -7,32 +7,11 @@
 #include <cstdlib>
 #include <string>
 
+#include "tessel/ReaderWriter.h"
 #include "workspace/Directory.h"
 #include "workspace/LiveObjects.h"
 
 namespace workspace_test {
-
-// One line per link, indented by depth, so that a failed tree assertion shows the whole tree.
-inline void DescribeInto(Directory* directory, int depth, std::string& out)
-{
-    std::int32_t index = 0;
-    const char* name = nullptr;
-    while (DirEnt* entry = directory->next(&index, &name)) {
-        out += std::string(static_cast<std::size_t>(depth) * 2, ' ') + name +
-               (entry->isDirectory() ? "/" : "") + " (count " + std::to_string(entry->refCount()) +
-               ")\n";
-        if (entry->isDirectory() && entry->parent() == directory) {
-            DescribeInto(static_cast<Directory*>(entry), depth + 1, out);
-        }
-    }
-}
-
-inline std::string DescribeTree(Directory* top)
-{
-    std::string out = "tree (count " + std::to_string(top->refCount()) + "):\n";
-    DescribeInto(top, 1, out);
-    return out;
-}
 
 // The path of an entry or handle as a std::string (the malloc'd buffer freed here).
 template <typename Holder> std::string PathOf(Holder* holder)
@@ -41,6 +20,22 @@ template <typename Holder> std::string PathOf(Holder* holder)
     std::string result = path != nullptr ? path : "<null>";
     std::free(path);
     return result;
+}
+
+inline std::int32_t Put(ReaderWriter* handle, const std::string& bytes)
+{
+    return handle->write(bytes.data(), static_cast<std::int32_t>(bytes.size()));
+}
+
+// Up to count bytes read from the handle, with a guard byte to catch a read past the count.
+inline std::string Take(ReaderWriter* handle, std::int32_t count)
+{
+    const std::size_t room = static_cast<std::size_t>(count > 0 ? count : 0);
+    std::string bytes(room + 1, '~');
+    const std::int32_t got = handle->read(bytes.data(), count);
+    EXPECT_EQ(bytes[room], '~') << "read past its count";
+    bytes.resize(static_cast<std::size_t>(got > 0 ? got : 0));
+    return bytes;
 }
 
 class WorkspaceTest : public ::testing::Test {
