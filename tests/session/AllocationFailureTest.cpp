@@ -41,8 +41,7 @@ void* operator new[](std::size_t size, const std::nothrow_t&) noexcept
 namespace {
 
 using tessel::Long;
-
-Long Code(std::uint32_t packed)
+constexpr Long Code(std::uint32_t packed)
 {
     return static_cast<Long>(packed);
 }
@@ -55,12 +54,9 @@ protected:
         SessionTest::TearDown();
     }
 
-    // Disk mode names its working files in the scratch directory, never the current one.
     std::string settingsFor()
     {
-        std::filesystem::create_directories(dir.path() + "tmp");
-        std::filesystem::create_directories(dir.path() + "fw");
-        return writeSettings("TEMP=" + dir.path() + "tmp/\nFIRMWARE=" + dir.path() + "fw/\n",
+        return writeSettings(diskPaths(),
                              std::string("[HEADERS]\na=One.h\nb=two.h\n[DEBUG]\nMEMFILES=") +
                                  (GetParam() ? "TRUE" : "FALSE") + "\n");
     }

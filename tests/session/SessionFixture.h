@@ -52,13 +52,14 @@ protected:
         return *session;
     }
 
-    // A session in disk mode with its working files in tmp/ and fw/ of the scratch directory.
-    BrickSession& openDisk(const std::string& rest = "")
+    // [PATHS] lines putting the disk-mode working files in tmp/ and fw/ of the scratch directory.
+    std::string diskPaths()
     {
         std::filesystem::create_directories(dir.path() + "tmp");
         std::filesystem::create_directories(dir.path() + "fw");
-        return open("TEMP=" + dir.path() + "tmp/\nFIRMWARE=" + dir.path() + "fw/\n", rest);
+        return "TEMP=" + dir.path() + "tmp/\nFIRMWARE=" + dir.path() + "fw/\n";
     }
+    BrickSession& openDisk(const std::string& rest = "") { return open(diskPaths(), rest); }
 
     static std::string contentOf(ReaderWriter* handle)
     {
