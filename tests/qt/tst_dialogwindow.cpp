@@ -1,5 +1,5 @@
-// The window of dialog 101: every control of the template with its id, kind, caption,
-// initial state and visibility, the menu 202 with its ids, and the commands its controls send.
+// The window of dialog 101 built from its template: the size, every control with its kind,
+// caption and initial state, the menu, and the commands the controls and items send.
 #include <QAction>
 #include <QCheckBox>
 #include <QFontInfo>
@@ -16,22 +16,29 @@
 
 using ui::DialogWindow;
 
+namespace {
+
+const ui::DialogTemplate& Layout()
+{
+    return ui::TestClientDialogTemplate();
+}
+
+} // namespace
+
 class tst_DialogWindow : public QObject {
     Q_OBJECT
 
 private slots:
-    void windowAndLayout();
-    void controls();
-    void menu_data();
+    void windowAndControls();
     void menu();
     void controlsSendTheirCommands();
-    void escapeAndCloseBoxSendCancel();
     void hostStyleDrawsTheSameArrows();
 };
 
-void tst_DialogWindow::windowAndLayout()
+void tst_DialogWindow::windowAndControls()
 {
-    DialogWindow window(ui::TestClientDialogTemplate());
+    DialogWindow window(Layout());
+    window.show();
     QCOMPARE(window.windowTitle(), QStringLiteral("Tessel Test Client"));
     // 372 by 289 dialog units of the dialog font; minimise box only, fixed size.
     QCOMPARE(window.centralWidget()->size(), QSize(window.pixelsX(372), window.pixelsY(289)));
@@ -40,14 +47,42 @@ void tst_DialogWindow::windowAndLayout()
     QVERIFY(!(window.windowFlags() & Qt::WindowMaximizeButtonHint));
     QCOMPARE(window.minimumSize(), window.maximumSize());
 
-    const QRect client = window.centralWidget()->rect();
-    const QList<int> ids = window.controlIds();
+    // Each control of the template as the widget of its kind, with its caption and state;
+    // check boxes and radio buttons start unchecked, the dialog's start sets them.
+    const char* const classes[] = {"QLabel",    "QGroupBox", "QLineEdit",    "QPlainTextEdit",
+                                   "QComboBox", "QCheckBox", "QRadioButton", "QPushButton"};
+    QList<int> ids;
+    for (int i = 0; i < Layout().controlCount; ++i) {
+        const ui::ControlSpec& spec = Layout().controls[i];
+        if (spec.id == ui::kNoControlId)
+            continue;
+        ids << spec.id;
+        const QByteArray row = QByteArray::number(spec.id);
+        QWidget* widget = window.control(spec.id);
+        QVERIFY2(widget != nullptr, row);
+        QCOMPARE(widget->metaObject()->className(), classes[int(spec.kind)]);
+        QCOMPARE(widget->property("controlId").toInt(), spec.id);
+        QString caption;
+        if (auto* button = qobject_cast<QAbstractButton*>(widget)) {
+            caption = button->text();
+            QVERIFY2(!button->isChecked(), row);
+        } else if (auto* line = qobject_cast<QLineEdit*>(widget)) {
+            caption = line->text();
+        } else if (auto* edit = qobject_cast<QPlainTextEdit*>(widget)) {
+            caption = edit->toPlainText();
+        }
+        QCOMPARE(caption, QString::fromLatin1(spec.caption));
+        QVERIFY2(widget->isEnabled() != bool(spec.style & ui::StyleDisabled), row);
+        const bool visible = !(spec.style & ui::StyleHidden);
+        QVERIFY2(widget->isVisible() == visible && widget->isHidden() != visible, row);
+    }
     QCOMPARE(ids.size(), 26);
+    const QRect client = window.centralWidget()->rect();
     for (int a : ids) {
         const QRect area = window.control(a)->geometry();
         QVERIFY2(client.contains(area), qPrintable(QStringLiteral("control %1 sticks out").arg(a)));
         for (int b : ids) {
-            QVERIFY2(a >= b || !area.intersects(window.control(b)->geometry()),
+            QVERIFY2(a == b || !area.intersects(window.control(b)->geometry()),
                      qPrintable(QStringLiteral("controls %1 and %2 overlap").arg(a).arg(b)));
         }
     }
@@ -65,127 +100,64 @@ void tst_DialogWindow::windowAndLayout()
     QCOMPARE(status->horizontalScrollBarPolicy(), Qt::ScrollBarAlwaysOff);
 }
 
-void tst_DialogWindow::controls()
-{
-    struct Expected {
-        int id;
-        const char* className;
-        const char* caption;
-    };
-    // clang-format off
-    const Expected table[] = {
-        {1015, "QPlainTextEdit", ""}, {1003, "QPlainTextEdit", ""}, {208, "QComboBox", ""},
-        {209, "QComboBox", ""}, {210, "QCheckBox", "Auto Clear"}, {223, "QCheckBox", "Auto Run"},
-        {224, "QCheckBox", "Receive"}, {213, "QLineEdit", ""}, {222, "QLineEdit", ""},
-        {214, "QLineEdit", ""}, {218, "QRadioButton", "Short"}, {219, "QRadioButton", "Medium"},
-        {220, "QRadioButton", "Long"}, {205, "QPushButton", "Open"}, {215, "QPushButton", "Close"},
-        {204, "QPushButton", "Test"}, {202, "QPushButton", "Validate"},
-        {203, "QPushButton", "Execute"}, {201, "QPushButton", "Download"},
-        {211, "QPushButton", "Download File"}, {207, "QPushButton", "New Firmware"},
-        {206, "QPushButton", "Statistics"}, {216, "QPushButton", "Info"},
-        {217, "QPushButton", "Async"}, {212, "QPushButton", "Stress"}, {221, "QPushButton", "Upload"},
-    };
-    // clang-format on
-    const QList<int> disabled = {218, 219, 220};
-    const QList<int> hidden = {217, 212, 214, 221, 224};
-    DialogWindow window(ui::TestClientDialogTemplate());
-    window.show();
-    for (const Expected& e : table) {
-        const QByteArray row = QByteArray::number(e.id);
-        QWidget* widget = window.control(e.id);
-        QVERIFY2(widget != nullptr, row);
-        QVERIFY2(QByteArray(widget->metaObject()->className()) == e.className, row);
-        QCOMPARE(widget->property("controlId").toInt(), e.id);
-        QString caption;
-        if (auto* button = qobject_cast<QAbstractButton*>(widget)) {
-            caption = button->text();
-            // Check boxes and radio buttons start unchecked; the dialog's start sets them.
-            QVERIFY2(!button->isChecked(), row);
-        } else if (auto* line = qobject_cast<QLineEdit*>(widget)) {
-            caption = line->text();
-        } else if (auto* edit = qobject_cast<QPlainTextEdit*>(widget)) {
-            caption = edit->toPlainText();
-        }
-        QCOMPARE(caption, QString::fromLatin1(e.caption));
-        QVERIFY2(widget->isEnabled() != disabled.contains(e.id), row);
-        const bool visible = !hidden.contains(e.id);
-        QVERIFY2(widget->isVisible() == visible && widget->isHidden() != visible, row);
-    }
-}
-
-void tst_DialogWindow::menu_data()
-{
-    QTest::addColumn<QString>("menu");
-    QTest::addColumn<QStringList>("captions");
-    QTest::addColumn<QList<int>>("ids");
-    QTest::addColumn<QList<int>>("greyed");
-
-    QTest::newRow("File") << "File"
-                          << QStringList{"&New", "&Open...", "&Save", "Save &As...", "", "E&xit"}
-                          << QList<int>{32768, 32774, 32769, 32770, 0, 32771} << QList<int>{};
-    QTest::newRow("Port") << "Port" << QStringList{"&Open", "&Test", "&Statistics", "&Close"}
-                          << QList<int>{205, 204, 206, 215} << QList<int>{};
-    QTest::newRow("Script") << "Script"
-                            << QStringList{"&Validate", "&Execute", "Execute &Async", "&Download"}
-                            << QList<int>{202, 203, 217, 201} << QList<int>{};
-    QTest::newRow("Special") << "Special" << QStringList{"&Info",           "&Upload",
-                                                         "&Stress",         "Download &Firmware",
-                                                         "&Convert to CSV", "&Macro To CSV"}
-                             << QList<int>{216, 221, 212, 207, 32775, 32777} << QList<int>{32775};
-    QTest::newRow("Help") << "Help" << QStringList{"About"} << QList<int>{32773} << QList<int>{};
-}
-
+// The menu bar holds the template's menus and items in order, greyed where it says.
 void tst_DialogWindow::menu()
 {
-    QFETCH(QString, menu);
-    QFETCH(QStringList, captions);
-    QFETCH(QList<int>, ids);
-    QFETCH(QList<int>, greyed);
-
-    DialogWindow window(ui::TestClientDialogTemplate());
-    QMenu* found = nullptr;
-    for (QAction* top : window.menuBar()->actions()) {
-        if (QString(top->text()).remove(QLatin1Char('&')) == menu)
-            found = top->menu();
-    }
-    QVERIFY2(found != nullptr, "no such menu");
-    const QList<QAction*> items = found->actions();
-    QCOMPARE(items.size(), captions.size());
-    for (int i = 0; i < items.size(); ++i) {
-        QCOMPARE(items[i]->isSeparator(), ids[i] == 0);
-        if (ids[i] == 0)
-            continue;
-        QCOMPARE(items[i]->text(), captions[i]);
-        QCOMPARE(items[i]->property("commandId").toInt(), ids[i]);
-        QCOMPARE(items[i]->isEnabled(), !greyed.contains(ids[i]));
+    DialogWindow window(Layout());
+    const QList<QAction*> menus = window.menuBar()->actions();
+    QCOMPARE(menus.size(), Layout().menuCount);
+    for (int m = 0; m < Layout().menuCount; ++m) {
+        const ui::MenuSpec& spec = Layout().menus[m];
+        QCOMPARE(menus[m]->text(), QString::fromLatin1(spec.caption));
+        const QList<QAction*> items = menus[m]->menu()->actions();
+        QCOMPARE(items.size(), spec.itemCount);
+        for (int i = 0; i < spec.itemCount; ++i) {
+            const ui::MenuItemSpec& item = spec.items[i];
+            QCOMPARE(items[i]->isSeparator(), item.caption == nullptr);
+            if (item.caption == nullptr)
+                continue;
+            QCOMPARE(items[i]->text(), QString::fromLatin1(item.caption));
+            QCOMPARE(items[i]->property("commandId").toInt(), item.id);
+            QCOMPARE(items[i]->isEnabled(), !item.greyed);
+            QCOMPARE(window.menuAction(item.id), items[i]);
+        }
     }
 }
 
 void tst_DialogWindow::controlsSendTheirCommands()
 {
-    DialogWindow window(ui::TestClientDialogTemplate());
+    DialogWindow window(Layout());
     window.show();
+    QVERIFY(QTest::qWaitForWindowExposed(&window));
     QSignalSpy commands(&window, &DialogWindow::commandIssued);
-    // Hidden buttons are reached by their menu items; the button itself sends the same.
-    for (int id : {205, 215, 204, 202, 203, 201, 211, 207, 206, 216, 217, 212, 221}) {
+    const auto sentOnly = [&](int id) {
+        const bool once = commands.count() == 1 && commands.at(0).at(0).toInt() == id;
         commands.clear();
-        qobject_cast<QPushButton*>(window.control(id))->click();
-        if (QAction* item = window.menuAction(id))
-            item->trigger();
-        QCOMPARE(commands.count(), window.menuAction(id) ? 2 : 1);
-        for (const QList<QVariant>& sent : commands)
-            QCOMPARE(sent.at(0).toInt(), id);
+        return once;
+    };
+    // Every button sends its id, hidden ones too.
+    for (int id : window.controlIds()) {
+        if (auto* button = qobject_cast<QPushButton*>(window.control(id))) {
+            button->click();
+            QVERIFY2(sentOnly(id), qPrintable(QString::number(id)));
+        }
     }
-
-    // A greyed item sends nothing, yet is wired for when the dialog enables it.
-    commands.clear();
-    QAction* convert = window.menuAction(32775);
-    convert->trigger();
-    QCOMPARE(commands.count(), 0);
-    convert->setEnabled(true);
-    convert->trigger();
-    QCOMPARE(commands.count(), 1);
-    QCOMPARE(commands.at(0).at(0).toInt(), 32775);
+    // So does every menu item; a greyed one sends nothing, yet is wired for when the dialog
+    // enables it.
+    for (int m = 0; m < Layout().menuCount; ++m) {
+        for (int i = 0; i < Layout().menus[m].itemCount; ++i) {
+            const ui::MenuItemSpec& spec = Layout().menus[m].items[i];
+            QAction* item = window.menuAction(spec.id);
+            if (item == nullptr)
+                continue;
+            item->trigger();
+            QCOMPARE(commands.count(), spec.greyed ? 0 : 1);
+            item->setEnabled(true);
+            commands.clear();
+            item->trigger();
+            QVERIFY2(sentOnly(spec.id), qPrintable(QString::number(spec.id)));
+        }
+    }
 
     // A check box is toggled before its command goes out.
     auto* autoRun = qobject_cast<QCheckBox*>(window.control(223));
@@ -193,22 +165,13 @@ void tst_DialogWindow::controlsSendTheirCommands()
     connect(&window, &DialogWindow::commandIssued, this,
             [&](int id) { checkedWhenSent = id == 223 && autoRun->isChecked(); });
     QTest::mouseClick(autoRun, Qt::LeftButton, {}, QPoint(4, autoRun->height() / 2));
-    QVERIFY(autoRun->isChecked() && checkedWhenSent);
-}
+    QVERIFY(autoRun->isChecked() && checkedWhenSent && sentOnly(223));
 
-void tst_DialogWindow::escapeAndCloseBoxSendCancel()
-{
-    DialogWindow window(ui::TestClientDialogTemplate());
-    window.show();
-    QVERIFY(QTest::qWaitForWindowExposed(&window));
-    QSignalSpy commands(&window, &DialogWindow::commandIssued);
+    // Escape and the close box both send Cancel; the dialog decides, so the window stays.
     QTest::keyClick(window.control(1015), Qt::Key_Escape);
-    // The close box asks the dialog, which decides; the window stays until it is destroyed.
+    QVERIFY(sentOnly(ui::kIdCancel));
     QVERIFY(!window.close());
-    QVERIFY(window.isVisible());
-    QCOMPARE(commands.count(), 2);
-    QCOMPARE(commands.at(0).at(0).toInt(), ui::kIdCancel);
-    QCOMPARE(commands.at(1).at(0).toInt(), ui::kIdCancel);
+    QVERIFY(window.isVisible() && sentOnly(ui::kIdCancel));
     window.allowClose();
     QVERIFY(window.close());
 }

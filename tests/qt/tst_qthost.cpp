@@ -1,6 +1,6 @@
-// The Qt host as the window layer: posting from other threads, the message loop and the
-// nested pump, window destruction with queued messages, the hidden plain window, controls
-// addressed by id with their texts kept byte for byte, and the answerer.
+// The Qt host as the window layer: posting from other threads, the loop and the nested pump,
+// destruction with messages queued, and controls addressed by id with their texts kept byte
+// for byte.
 #include <QAbstractButton>
 #include <QApplication>
 #include <QMessageBox>
@@ -19,36 +19,15 @@
 #include "ui/qt/QtHost.h"
 
 using qt_test::RecordingObject;
-using qt_test::ScriptedAnswerer;
-using ui::QtHost;
 
 namespace {
 
 constexpr ui::Message kTestMessage = ui::kMsgUser + 7;
 
-std::string Text(QtHost& host, ui::WindowHandle window, int id, std::uint32_t size = 4096)
+std::string Text(ui::QtHost& host, ui::WindowHandle window, int id, std::uint32_t size = 4096)
 {
     std::vector<char> buffer(size);
-    const std::uint32_t n = host.GetControlText(window, id, buffer.data(), size);
-    return std::string(buffer.data(), n);
-}
-
-// Presses button of the next modal message box once it is up, and notes its text and owner.
-void AnswerNextBox(QMessageBox::StandardButton button, QString* text, QWidget** owner)
-{
-    auto* timer = new QTimer;
-    timer->setInterval(10);
-    QObject::connect(timer, &QTimer::timeout, timer, [timer, button, text, owner] {
-        auto* box = qobject_cast<QMessageBox*>(QApplication::activeModalWidget());
-        if (box == nullptr)
-            return;
-        *text = box->text();
-        *owner = box->parentWidget();
-        timer->stop();
-        timer->deleteLater();
-        box->button(button)->click();
-    });
-    timer->start();
+    return std::string(buffer.data(), host.GetControlText(window, id, buffer.data(), size));
 }
 
 } // namespace
@@ -59,7 +38,6 @@ class tst_QtHost : public QObject {
 private slots:
     void init();
     void cleanup();
-    void dialogWindowLifetime();
     void postFromOtherThreadsArrivesInOrder();
     void destroyHandsQueuedMessagesBack();
     void quitEndsNestedPumpAndLoop();
@@ -72,40 +50,34 @@ private slots:
     void answerer();
 
 private:
-    std::unique_ptr<QtHost> host_;
+    QPlainTextEdit* editor() const
+    {
+        return qobject_cast<QPlainTextEdit*>(host_->dialogWindow(dialog_)->control(1015));
+    }
+
+    std::unique_ptr<ui::QtHost> host_;
     std::unique_ptr<RecordingObject> object_;
     ui::WindowHandle dialog_ = ui::kNoWindow; // the test client's window, made for each test
 };
 
 void tst_QtHost::init()
 {
-    host_ = std::make_unique<QtHost>("");
+    host_ = std::make_unique<ui::QtHost>("");
     object_ = std::make_unique<RecordingObject>();
     dialog_ = host_->CreateDialogWindow(ui::TestClientDialogTemplate(), object_.get());
     QVERIFY(dialog_ != ui::kNoWindow);
-}
-
-void tst_QtHost::cleanup()
-{
-    if (host_->WindowExists(dialog_))
-        host_->DestroyWindow(dialog_);
-    host_.reset();
-    object_.reset();
-}
-
-void tst_QtHost::dialogWindowLifetime()
-{
     QCOMPARE(object_->handle(), dialog_);
     QCOMPARE(object_->count(ui::kMsgInitDialog), 1);
-    host_->ShowWindow(dialog_);
-    QVERIFY(host_->dialogWindow(dialog_)->isVisible());
-    host_->SetWindowTitle(dialog_, "Tessel Test Client - demo.onyx2");
-    QCOMPARE(host_->dialogWindow(dialog_)->windowTitle(),
-             QStringLiteral("Tessel Test Client - demo.onyx2"));
+}
+
+// Every test ends by destroying the dialog window, which its object hears of once.
+void tst_QtHost::cleanup()
+{
     host_->DestroyWindow(dialog_);
     QCOMPARE(object_->handle(), ui::kNoWindow);
     QCOMPARE(object_->count(ui::kMsgDestroy), 1);
     QVERIFY(!host_->WindowExists(dialog_));
+    host_.reset();
 }
 
 void tst_QtHost::postFromOtherThreadsArrivesInOrder()
@@ -117,18 +89,16 @@ void tst_QtHost::postFromOtherThreadsArrivesInOrder()
     for (int t = 0; t < 3; ++t) {
         threads.emplace_back([this, window, t] {
             for (int i = 0; i < kPerThread; ++i)
-                host_->PostMessage(window, kTestMessage, static_cast<ui::WParam>(t),
-                                   static_cast<ui::LParam>(i));
+                host_->PostMessage(window, kTestMessage, ui::WParam(t), ui::LParam(i));
         });
     }
     for (std::thread& thread : threads)
         thread.join();
     QTRY_COMPARE(object.count(kTestMessage), 3 * kPerThread);
-    // Each thread's messages arrive in the order it posted them.
     int next[3] = {0, 0, 0};
     for (const RecordingObject::Received& r : object.received) {
         if (r.message == kTestMessage)
-            QCOMPARE(r.lParam, static_cast<ui::LParam>(next[r.wParam]++));
+            QCOMPARE(r.lParam, ui::LParam(next[r.wParam]++));
     }
     QCOMPARE(host_->QueuedMessages(), std::size_t(0));
     host_->DestroyWindow(window);
@@ -156,14 +126,12 @@ void tst_QtHost::destroyHandsQueuedMessagesBack()
 
 void tst_QtHost::quitEndsNestedPumpAndLoop()
 {
-    std::thread poster([this] { host_->PostMessage(dialog_, kTestMessage, 0, 5); });
-    poster.join();
+    std::thread([this] { host_->PostMessage(dialog_, kTestMessage, 0, 5); }).join();
     while (object_->count(kTestMessage) == 0)
         QVERIFY(host_->PumpMessage());
-    std::thread quitter([this] { host_->PostQuit(7); });
-    quitter.join();
-    // The nested pump sees the request and dispatches nothing; the request stays for the
-    // outer loop, which ends at once with the first request's code.
+    std::thread([this] { host_->PostQuit(7); }).join();
+    // The nested pump dispatches nothing and leaves the request to the outer loop, which
+    // ends at once with the first request's code.
     QVERIFY(!host_->PumpMessage());
     host_->PostQuit(3);
     QCOMPARE(host_->RunMessageLoop(), 7);
@@ -216,7 +184,6 @@ void tst_QtHost::textRoundTrip()
 // hold as '?'. A length query followed by an edit never hands out the text it measured.
 void tst_QtHost::typedTextAsBytes()
 {
-    auto* editor = qobject_cast<QPlainTextEdit*>(host_->dialogWindow(dialog_)->control(1015));
     const auto read = [this] {
         const std::uint32_t length = host_->GetControlTextLength(dialog_, 1015);
         const QByteArray bytes = QByteArray::fromStdString(Text(*host_, dialog_, 1015, 1 << 16));
@@ -224,21 +191,22 @@ void tst_QtHost::typedTextAsBytes()
     };
 
     host_->SetControlText(dialog_, 1015, "task main\r\n");
-    editor->moveCursor(QTextCursor::End);
+    editor()->moveCursor(QTextCursor::End);
     const QString line = QStringLiteral("a long line of script text, well past a few characters");
-    editor->insertPlainText(line + QChar(QChar::LineSeparator) + QStringLiteral("x\ny") +
-                            QChar(QChar::ParagraphSeparator) + QStringLiteral("\u00e9\U0001F600"));
+    editor()->insertPlainText(line + QChar(QChar::LineSeparator) + QStringLiteral("x\ny") +
+                              QChar(QChar::ParagraphSeparator) +
+                              QStringLiteral("\u00e9\U0001F600"));
     QCOMPARE(read(), "task main\r\n" + line.toUtf8() + "\r\nx\r\ny\r\n\xc3\xa9\xf0\x9f\x98\x80");
 
     host_->SetControlText(dialog_, 1015, "Gr\xfc\xdf\n"); // not UTF-8: one byte a character
-    editor->moveCursor(QTextCursor::End);
-    editor->insertPlainText(QStringLiteral("\u00e9\u20ac"));
+    editor()->moveCursor(QTextCursor::End);
+    editor()->insertPlainText(QStringLiteral("\u00e9\u20ac"));
     QCOMPARE(read(), QByteArray("Gr\xfc\xdf\n\xe9?"));
 
     host_->SetControlText(dialog_, 1015, "measured");
     QCOMPARE(host_->GetControlTextLength(dialog_, 1015), std::uint32_t(8));
-    editor->moveCursor(QTextCursor::End);
-    editor->insertPlainText(QStringLiteral(" then typed"));
+    editor()->moveCursor(QTextCursor::End);
+    editor()->insertPlainText(QStringLiteral(" then typed"));
     QCOMPARE(QByteArray::fromStdString(Text(*host_, dialog_, 1015)),
              QByteArray("measured then typed"));
     QCOMPARE(host_->GetControlTextLength(dialog_, 1015), std::uint32_t(19));
@@ -252,8 +220,7 @@ void tst_QtHost::selectionInBytes_data()
     QTest::addColumn<int>("offset");
     QTest::addColumn<QString>("before");
 
-    // The offset counts bytes of the text as the dialog reads it, as a translation error's
-    // position does.
+    // Offsets count bytes of the text as the dialog reads it, as a translation error's do.
     QTest::newRow("LF") << QByteArray("ab\ncd") << 4 << "ab\nc";
     QTest::newRow("CR LF") << QByteArray("ab\r\ncd") << 5 << "ab\nc";
     QTest::newRow("UTF-8") << QByteArray("\xc3\xa4\xc3\xb6x") << 4
@@ -271,9 +238,8 @@ void tst_QtHost::selectionInBytes()
 
     host_->SetControlText(dialog_, 1015, bytes.constData());
     host_->SetEditSelection(dialog_, 1015, offset, offset);
-    auto* editor = qobject_cast<QPlainTextEdit*>(host_->dialogWindow(dialog_)->control(1015));
-    QCOMPARE(editor->textCursor().position(), int(before.size()));
-    QVERIFY(!editor->textCursor().hasSelection());
+    QCOMPARE(editor()->textCursor().position(), int(before.size()));
+    QVERIFY(!editor()->textCursor().hasSelection());
     std::int32_t start = -5;
     std::int32_t end = -5;
     host_->GetEditSelection(dialog_, 1015, &start, &end);
@@ -290,7 +256,6 @@ void tst_QtHost::listsAndChecks()
     // Unlike a Qt combo box, a drop-down list selects nothing by itself.
     QCOMPARE(host_->ListSelection(dialog_, 208), -1);
     host_->ListSelect(dialog_, 208, 1);
-    QCOMPARE(host_->ListSelection(dialog_, 208), 1);
     QCOMPARE(QByteArray::fromStdString(Text(*host_, dialog_, 208)), QByteArray("Onyx2"));
     host_->ListSelect(dialog_, 208, 5);
     QCOMPARE(host_->ListSelection(dialog_, 208), -1);
@@ -309,7 +274,7 @@ void tst_QtHost::listsAndChecks()
 
 void tst_QtHost::answerer()
 {
-    ScriptedAnswerer answerer;
+    qt_test::ScriptedAnswerer answerer;
     host_->SetAnswerer(&answerer);
     char path[16] = "keep";
     ui::FileDialogRequest request;
@@ -319,20 +284,29 @@ void tst_QtHost::answerer()
     QVERIFY(host_->ChooseOpenFile(request));
     QCOMPARE(QByteArray(path), QByteArray("/tmp/0123456789"));
     std::strcpy(path, "keep");
+    // Cut, it would name another file; cancelled, there is none.
     answerer.QueueFile(QStringLiteral("/tmp/0123456789a"));
-    // Cut, it would name another file.
     QVERIFY(!host_->ChooseOpenFile(request));
+    QVERIFY(!host_->ChooseSaveFile(request));
     QCOMPARE(QByteArray(path), QByteArray("keep"));
 
     // Without an injected answerer the real modal box asks; a timer presses No.
     host_->SetAnswerer(nullptr);
     host_->ShowWindow(dialog_);
-    QString seenText;
-    QWidget* seenParent = nullptr;
-    AnswerNextBox(QMessageBox::No, &seenText, &seenParent);
+    QString text;
+    QWidget* owner = nullptr;
+    QTimer timer;
+    connect(&timer, &QTimer::timeout, this, [&] {
+        if (auto* box = qobject_cast<QMessageBox*>(QApplication::activeModalWidget())) {
+            text = box->text();
+            owner = box->parentWidget();
+            box->button(QMessageBox::No)->click();
+        }
+    });
+    timer.start(10);
     QVERIFY(!host_->AskYesNo(dialog_, "Status: no tower.\r\nUse Trouble Shooter?", "Diagnostics"));
-    QCOMPARE(seenText, QStringLiteral("Status: no tower.\nUse Trouble Shooter?"));
-    QCOMPARE(seenParent, static_cast<QWidget*>(host_->dialogWindow(dialog_)));
+    QCOMPARE(text, QStringLiteral("Status: no tower.\nUse Trouble Shooter?"));
+    QCOMPARE(owner, static_cast<QWidget*>(host_->dialogWindow(dialog_)));
 }
 
 QTEST_MAIN(tst_QtHost)
