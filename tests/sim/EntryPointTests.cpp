@@ -29,7 +29,7 @@ TEST(ExportTable, NamesTheSixteenEntryPointsInSlotOrder)
 
 class Ports : public SimTest {};
 
-TEST_F(Ports, FindPortWalksTheTowersWithinTheBuffer)
+TEST_F(Ports, SearchesAndEnumerationsListTheirItemsWithinTheBuffer)
 {
     char name[tessel::kPathSize] = "";
     ASSERT_EQ(api().findPort(name, sizeof name), 0);
@@ -37,11 +37,32 @@ TEST_F(Ports, FindPortWalksTheTowersWithinTheBuffer)
     ASSERT_EQ(api().findPort(name, sizeof name), 0);
     EXPECT_STREQ(name, "COM1");
     EXPECT_EQ(api().findPort(name, sizeof name), kNoMoreItems);
-    char small[8] = "";
-    std::memset(small + 1, 'x', sizeof small - 1);
+    EXPECT_EQ(api().findPort(nullptr, 260), kNullParameter);
+    char small[8];
+    std::memset(small, 'x', sizeof small);
     EXPECT_LT(api().findPort(small, 4), 0); // "KIVOTOWER1" does not fit
     EXPECT_EQ(small[4], 'x');
-    EXPECT_EQ(api().findPort(nullptr, 260), kNullParameter);
+    EXPECT_EQ(api().findFirst(tessel::EnumComPorts, nullptr, name, sizeof name), kNullParameter);
+    Short item = 0;
+    EXPECT_EQ(api().findFirst(tessel::EnumUsbPorts, &item, small, 4), 0);
+    EXPECT_STREQ(small, "KIV");
+    EXPECT_EQ(small[4], 'x');
+    EXPECT_EQ(api().findNext(tessel::EnumUsbPorts, &item, name, sizeof name), kNoMoreItems);
+
+    std::vector<std::string> names;
+    for (Long r = api().findFirst(tessel::EnumBrickTypes, &item, name, sizeof name);
+         r >= 0 && names.size() < 20;
+         r = api().findNext(tessel::EnumBrickTypes, &item, name, sizeof name)) {
+        names.push_back(name);
+    }
+    EXPECT_NE(std::find(names.begin(), names.end(), "Onyx2"), names.end());
+    EXPECT_NE(std::find(names.begin(), names.end(), "Rover"), names.end());
+    EXPECT_EQ(api().findFirst(tessel::EnumSourceTypes, &item, name, sizeof name), 0);
+    EXPECT_EQ(api().findFirst(tessel::EnumTargetTypes, &item, name, sizeof name), 0);
+    EXPECT_EQ(api().findFirst(9, &item, name, sizeof name), Code(0xE0050C53u));
+    EXPECT_EQ(api().findNext(-1, &item, name, sizeof name), Code(0xE0050C53u));
+    EXPECT_EQ(api().findNext(tessel::EnumComPorts, nullptr, name, sizeof name), Code(0xE0050C51u));
+    EXPECT_EQ(api().findFirst(tessel::EnumComPorts, &item, nullptr, 260), kNullParameter);
 }
 
 TEST_F(Ports, CreateTakesOneHandlePerPortAndItIsReportedLive)
@@ -65,11 +86,12 @@ TEST_F(Ports, CreateTakesOneHandlePerPortAndItIsReportedLive)
     EXPECT_EQ(api().findFirst(tessel::EnumComPorts, &item, name, sizeof name), 0);
 }
 
-TEST_F(Ports, ComPortFaultsCarryTheirDriverCodes)
+TEST_F(Ports, ComPortFaultsCarryTheirDriverCodesAndPortsNameTheirBricks)
 {
-    useScenario("[port COM1]\nstate = in-use\n[port COM2]\nstate = conflict\n"
+    useScenario("link-time = 0\n[brick a]\ntype = rover\n[brick b]\ntype = onyx2\n"
+                "[port COM1]\nstate = in-use\n[port COM2]\nstate = conflict\n"
                 "[port COM3]\nstate = missing\n[port COM4]\nstate = serial-mouse\n"
-                "[port COM5]\n");
+                "[port COM5]\nbrick = b\n[port COM6]\nbrick = a\n[port COM7]\nbrick = none\n");
     Short item = 0;
     char name[tessel::kPathSize];
     std::vector<std::pair<std::string, Long>> seen;
@@ -82,52 +104,30 @@ TEST_F(Ports, ComPortFaultsCarryTheirDriverCodes)
                                                                 {"COM2", Code(0xE0050451u)},
                                                                 {"COM3", Code(0xE0050452u)},
                                                                 {"COM4", Code(0xE0050453u)},
-                                                                {"COM5", 0}};
+                                                                {"COM5", 0},
+                                                                {"COM6", 0},
+                                                                {"COM7", 0}};
     EXPECT_EQ(seen, expected);
-    EXPECT_EQ(item, 5);
+    EXPECT_EQ(item, 7);
     // A usable port with a tower is found; the unusable ones cannot be opened.
-    char port[tessel::kPathSize] = "";
-    EXPECT_EQ(api().findPort(port, sizeof port), 0);
-    EXPECT_STREQ(port, "COM5");
+    name[0] = '\0'; // an empty name starts the search
+    EXPECT_EQ(api().findPort(name, sizeof name), 0);
+    EXPECT_STREQ(name, "COM5");
     EXPECT_EQ(open("COM1"), 0);
-}
-
-TEST_F(Ports, EnumerationsListTypesRejectBadArgumentsAndCutToTheBuffer)
-{
-    Short item = 0;
-    char name[tessel::kPathSize];
-    std::vector<std::string> names;
-    for (Long r = api().findFirst(tessel::EnumBrickTypes, &item, name, sizeof name);
-         r >= 0 && names.size() < 20;
-         r = api().findNext(tessel::EnumBrickTypes, &item, name, sizeof name)) {
-        names.push_back(name);
-    }
-    EXPECT_NE(std::find(names.begin(), names.end(), "Onyx2"), names.end());
-    EXPECT_NE(std::find(names.begin(), names.end(), "Rover"), names.end());
-    EXPECT_EQ(api().findFirst(tessel::EnumSourceTypes, &item, name, sizeof name), 0);
-    EXPECT_EQ(api().findFirst(tessel::EnumTargetTypes, &item, name, sizeof name), 0);
-    EXPECT_EQ(api().findFirst(tessel::EnumUsbPorts, &item, name, sizeof name), 0);
-    EXPECT_STREQ(name, "KIVOTOWER1");
-    EXPECT_EQ(api().findNext(tessel::EnumUsbPorts, &item, name, sizeof name), kNoMoreItems);
-
-    EXPECT_EQ(api().findFirst(9, &item, name, sizeof name), Code(0xE0050C53u));
-    EXPECT_EQ(api().findNext(-1, &item, name, sizeof name), Code(0xE0050C53u));
-    EXPECT_EQ(api().findNext(tessel::EnumComPorts, nullptr, name, sizeof name), Code(0xE0050C51u));
-    EXPECT_EQ(api().findFirst(tessel::EnumComPorts, nullptr, name, sizeof name), kNullParameter);
-    EXPECT_EQ(api().findFirst(tessel::EnumComPorts, &item, nullptr, 260), kNullParameter);
-
-    char small[6];
-    std::memset(small, 'x', sizeof small);
-    EXPECT_EQ(api().findFirst(tessel::EnumUsbPorts, &item, small, 4), 0);
-    EXPECT_STREQ(small, "KIV");
-    EXPECT_EQ(small[4], 'x');
+    Short type = -1;
+    EXPECT_EQ(api().findBrick(open("COM5"), &type, nullptr), 0);
+    EXPECT_EQ(type, tessel::BrickOnyx2);
+    EXPECT_EQ(api().findBrick(open("COM6"), &type, nullptr), 0);
+    EXPECT_EQ(type, tessel::BrickRover);
+    EXPECT_EQ(api().findBrick(open("COM7"), &type, nullptr), Code(0xE0050402u));
+    EXPECT_EQ(type, tessel::BrickNone);
 }
 
 class Properties : public SimTest {};
 
-TEST_F(Properties, RangeBelongsToUsbTowersOnly)
+TEST_F(Properties, RangeBelongsToUsbTowersThatHaveIt)
 {
-    const Long handle = open("KIVOTOWER1");
+    Long handle = open("KIVOTOWER1");
     Short value = 0;
     char text[tessel::kPathSize];
     ASSERT_EQ(api().get(handle, tessel::PropPort, &value, text, sizeof text), 0);
@@ -146,23 +146,20 @@ TEST_F(Properties, RangeBelongsToUsbTowersOnly)
     EXPECT_LT(api().get(serial, tessel::PropRange, &value, nullptr, 0), 0);
     EXPECT_LT(api().set(serial, tessel::PropRange, tessel::RangeShort), 0);
     EXPECT_LT(api().get(serial, tessel::PropLongRange, &value, nullptr, 0), 0);
-}
 
-TEST_F(Properties, LongRangeFailsWhereTheTowerHasNone)
-{
-    useScenario("[brick b]\n[port KIVOTOWER1]\nlong-range = no\n");
-    Long handle = open("KIVOTOWER1");
-    Short value = 0;
-    ASSERT_EQ(api().get(handle, tessel::PropLongRange, &value, nullptr, 0), 0);
-    EXPECT_NE(value, tessel::kLongRangeAvailable);
-    EXPECT_EQ(api().set(handle, tessel::PropRange, tessel::RangeLong), Code(0xE0050413u));
-    // A tower that claims the long range and fails to switch.
-    useShipped("short-range.sim");
-    handle = open("KIVOTOWER1");
-    ASSERT_EQ(api().get(handle, tessel::PropLongRange, &value, nullptr, 0), 0);
-    EXPECT_EQ(value, tessel::kLongRangeAvailable);
-    EXPECT_EQ(api().set(handle, tessel::PropRange, tessel::RangeLong), Code(0xE0050413u));
-    EXPECT_EQ(api().set(handle, tessel::PropRange, tessel::RangeShort), 0);
+    // A tower without the long range, then one that claims it and fails to switch.
+    for (bool claims : {false, true}) {
+        if (claims) {
+            useShipped("short-range.sim");
+        } else {
+            useScenario("[brick b]\n[port KIVOTOWER1]\nlong-range = no\n");
+        }
+        handle = open("KIVOTOWER1");
+        ASSERT_EQ(api().get(handle, tessel::PropLongRange, &value, nullptr, 0), 0);
+        EXPECT_EQ(value == tessel::kLongRangeAvailable, claims);
+        EXPECT_EQ(api().set(handle, tessel::PropRange, tessel::RangeLong), Code(0xE0050413u));
+        EXPECT_EQ(api().set(handle, tessel::PropRange, tessel::RangeShort), 0);
+    }
 }
 
 TEST_F(Properties, StatisticsCountTheTrafficAfterCollectionStarts)
@@ -198,7 +195,7 @@ TEST_F(Properties, EveryReadablePropertyAnswersAndUnknownOnesAreRefused)
         EXPECT_GE(value, 0) << property;
     }
     Short value = 0;
-    char name[tessel::kBrickNameSize];
+    char name[tessel::kStatusTextSize];
     ASSERT_EQ(api().get(handle, tessel::PropBrickType, &value, name, sizeof name), 0);
     EXPECT_EQ(value, tessel::BrickOnyx2);
     EXPECT_NE(std::strstr(name, "Onyx2"), nullptr);
@@ -207,9 +204,16 @@ TEST_F(Properties, EveryReadablePropertyAnswersAndUnknownOnesAreRefused)
     EXPECT_EQ(api().get(handle, tessel::PropExecRetries, nullptr, nullptr, 0), kNullParameter);
     EXPECT_EQ(api().get(12345, tessel::PropPort, &value, nullptr, 0), kBadHandle);
     EXPECT_EQ(api().set(0, tessel::PropRange, 1), kBadHandle);
-    EXPECT_EQ(api().set(handle, tessel::PropBrickType, 5), 0);
+    EXPECT_EQ(api().findBrick(handle, nullptr, nullptr), kNullParameter);
+    EXPECT_EQ(api().findBrick(999, &value, nullptr), kBadHandle);
+    EXPECT_EQ(api().status(0, tessel::StatusPort, nullptr, 0), 3);
+    EXPECT_EQ(api().status(handle, tessel::StatusDownloadProgress, nullptr, 0), 0);
+    // A brick type property that differs from the brick makes the client detect it again.
+    EXPECT_EQ(api().set(handle, tessel::PropBrickType, tessel::BrickRover), 0);
     ASSERT_EQ(api().get(handle, tessel::PropBrickType, &value, nullptr, 0), 0);
     EXPECT_EQ(value, tessel::BrickRover);
+    EXPECT_EQ(api().status(handle, tessel::StatusBrick, name, sizeof name),
+              tessel::kBrickTypeChanged);
 }
 
 TEST_F(Properties, TraceOptionsAppendLinesToTheTraceFile)
@@ -237,26 +241,7 @@ TEST_F(Properties, TraceOptionsAppendLinesToTheTraceFile)
     EXPECT_EQ(text.find("KIVOTOWER1"), std::string::npos) << text;
 }
 
-class Status : public SimTest {};
-
-TEST_F(Status, PortAndBrickOfAWorkingInstallation)
-{
-    const Long handle = open("KIVOTOWER1");
-    char text[tessel::kStatusTextSize];
-    EXPECT_EQ(api().status(handle, tessel::StatusPort, nullptr, 0), 1);
-    EXPECT_EQ(api().status(handle, tessel::StatusBrick, text, sizeof text), tessel::kBrickAnswers);
-    EXPECT_EQ(api().status(0, tessel::StatusPort, nullptr, 0), 3);
-    EXPECT_EQ(api().status(handle, tessel::StatusDownloadProgress, nullptr, 0), 0);
-    // A brick type property that differs from the brick makes the client detect it again.
-    api().set(handle, tessel::PropBrickType, tessel::BrickRover);
-    EXPECT_EQ(api().status(handle, tessel::StatusBrick, text, sizeof text),
-              tessel::kBrickTypeChanged);
-    Short type = 0;
-    EXPECT_EQ(api().findBrick(handle, nullptr, nullptr), kNullParameter);
-    EXPECT_EQ(api().findBrick(999, &type, nullptr), kBadHandle);
-}
-
-TEST_F(Status, EveryInfoIdOfTheBrickTypes)
+TEST_F(Properties, InfoAnswersEveryIdOfTheBrickTypes)
 {
     for (Short id : {1, 2, 3, 4, 5, 6, 7, 8, 11, 13, 14, 15, 18}) {
         Short value = -1;

@@ -1,17 +1,19 @@
-// Test harness for the simulated brick library: loads Tessel.dll by absolute path as the client
-// does, finds the sixteen entry points through its export table, builds a real workspace tree
-// with the client's workspace classes, records callbacks that arrive from library threads, and
-// writes object text by hand so that the tests do not depend on the translator.
+// Loads Tessel.dll by absolute path as the client does, takes the sixteen entry points from its
+// export table, and gives each test the client's own workspace classes and a callback recorder.
+// Object text is written by hand so that the brick tests do not depend on the translator.
 #pragma once
 
 #include <dlfcn.h>
 #include <gtest/gtest.h>
+#include <unistd.h>
 
 #include <chrono>
 #include <condition_variable>
 #include <cstdio>
 #include <cstdlib>
 #include <cstring>
+#include <fstream>
+#include <memory>
 #include <mutex>
 #include <string>
 #include <vector>
@@ -37,9 +39,7 @@ inline constexpr Long kNullParameter = Code(0xE0050C64u);
 inline constexpr Long kBadHandle = Code(0xE0050401u);
 inline const char* const kVersion309 = "0x00,0x03,0x00,0x01,0x00,0x03,0x00,0x09";
 
-// Loaded once for the whole test program, never unloaded (library threads are joined by
-// tslTerminate in every test's tear-down). Entry points are taken from the export table by slot,
-// whose order ExportTable.NamesTheSixteenEntryPointsInSlotOrder checks.
+// Loaded once, never unloaded: every tear-down joins the library's threads with tslTerminate.
 struct Api {
     void* module = dlopen(TESSEL_SIM_MODULE, RTLD_NOW | RTLD_LOCAL);
     const tessel::ExportEntry* table =
@@ -167,16 +167,14 @@ public:
     {
         ReaderWriter* handle = open(path, 0);
         std::string text = ReadHandle(handle);
-        if (handle != nullptr) {
-            handle->release();
-        }
+        handle->release();
         return text;
     }
 
     static std::string ReadHandle(ReaderWriter* handle)
     {
         std::string text;
-        if (handle == nullptr || !(handle->openRead() == RwOk)) {
+        if (!(handle->openRead() == RwOk)) {
             return text;
         }
         char buffer[512];
@@ -187,7 +185,7 @@ public:
         return text;
     }
 
-    // Object text placed in object.txt, handed out as a code handle (type 4).
+    // Object text placed in object.txt, handed out as a code handle.
     ReaderWriter* code(const std::string& objectText)
     {
         write("/Script/Temp/object.txt", objectText, tessel::FileCode);
@@ -217,8 +215,7 @@ protected:
         if (!scenarioFile_.empty()) {
             std::remove(scenarioFile_.c_str());
         }
-        delete workspace_;
-        workspace_ = nullptr;
+        workspace_.reset();
         EXPECT_EQ(workspace::LiveObjectCount(), liveBefore_);
     }
 
@@ -230,24 +227,15 @@ protected:
     // Restarts the library with scenario text of the test's own.
     void useScenario(const std::string& text)
     {
-        if (scenarioFile_.empty()) {
-            char name[] = "/tmp/simcore-scenario-XXXXXX";
-            const int fd = mkstemp(name);
-            ASSERT_GE(fd, 0);
-            close(fd);
-            scenarioFile_ = name;
-        }
-        std::FILE* file = std::fopen(scenarioFile_.c_str(), "wb");
-        ASSERT_NE(file, nullptr);
-        std::fwrite(text.data(), 1, text.size(), file);
-        std::fclose(file);
+        scenarioFile_ = testing::TempDir() + "sim-scenario-" + std::to_string(getpid());
+        std::ofstream(scenarioFile_, std::ios::binary) << text;
         restart(scenarioFile_);
     }
 
     Workspace& ws()
     {
-        if (workspace_ == nullptr) {
-            workspace_ = new Workspace();
+        if (!workspace_) {
+            workspace_ = std::make_unique<Workspace>();
         }
         return *workspace_;
     }
@@ -293,7 +281,7 @@ private:
 
     std::int64_t liveBefore_ = 0;
     std::string scenarioFile_;
-    Workspace* workspace_ = nullptr;
+    std::unique_ptr<Workspace> workspace_;
 };
 
 // Object text: one "cmd" line per instruction, bytes in hexadecimal (see sim/lang/Program.h).
@@ -345,15 +333,6 @@ inline std::string SoundProgram(int commands)
         text += "cmd 20 01\n";
     }
     return text + "cmd 17\nend\n";
-}
-
-inline std::string Firmware(int version, int records)
-{
-    std::string text = Cmd("tobj 1 6 firmware %04d\n", version);
-    for (int i = 0; i < records; ++i) {
-        text += Cmd("cmd fw %04x 01 02 03 04\n", 0x1000 + 4 * i);
-    }
-    return text;
 }
 
 } // namespace simtest

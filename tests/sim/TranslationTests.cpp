@@ -34,18 +34,6 @@ protected:
     ErrorSink sink_;
 };
 
-TEST_F(Translation, AnImmediateScriptRunsOnTheBrick)
-{
-    ASSERT_EQ(translate("brick version?"), 0);
-    ReaderWriter* code = ws().open("/Script/Temp/object.txt", tessel::FileCode);
-    ReaderWriter* result = ws().open("/Script/Temp/result.txt", tessel::FileResult);
-    Long number = 0;
-    EXPECT_EQ(api().exec(open("KIVOTOWER1"), code, &number, result, nullptr, nullptr), 0);
-    EXPECT_EQ(Workspace::ReadHandle(result), kVersion309);
-    result->release();
-    code->release();
-}
-
 TEST_F(Translation, IncludesComeFromTheWorkspaceUnderTheirLowerCaseName)
 {
     const std::string program =
@@ -116,33 +104,49 @@ TEST_F(Translation, HostileSourcesFailWithACompilerCode)
     EXPECT_EQ(translate(std::string(9u << 20, 'a')), Code(0xE0050898u));
 }
 
-TEST_F(Translation, FirmwareImagesTranslateAndDownloadInBootMode)
+// Also runs a translated immediate script, to read the version the new firmware reports.
+TEST_F(Translation, FirmwareImagesDownloadInBootModeOnlyAndReplaceTheFirmware)
 {
     useShipped("no-firmware.sim");
     const Long handle = open("KIVOTOWER1");
-    ASSERT_EQ(run(handle, Immediate(kBootRom)), 0); // before object.txt is filled
     const std::string image =
         ReadHostFile(std::string(TESSEL_RESOURCE_DIR) + "/firmware/Onyx2firm.kvo");
-    ASSERT_EQ(translate(image, tessel::FileFirmware), 0) << sink_.GetText();
-    const std::string object = ws().read("/Script/Temp/object.txt");
-    Long total = 0;
-    for (std::size_t at = object.find("cmd"); at != std::string::npos;
-         at = object.find("cmd", at + 3)) {
-        ++total;
+    for (bool bootMode : {false, true}) {
+        if (bootMode) {
+            ASSERT_EQ(run(handle, Immediate(kBootRom)), 0);
+        }
+        ASSERT_EQ(translate(image, tessel::FileFirmware), 0) << sink_.GetText();
+        const std::string object = ws().read("/Script/Temp/object.txt");
+        Long total = 0;
+        for (std::size_t at = object.find("cmd"); at != std::string::npos;
+             at = object.find("cmd", at + 3)) {
+            ++total;
+        }
+        Recorder recorder;
+        ReaderWriter* code = ws().open("/Script/Temp/object.txt", tessel::FileCode);
+        const Long started = api().download(handle, code, &Recorder::Callback, &recorder);
+        code->release();
+        if (!bootMode) {
+            EXPECT_EQ(started, Code(0xE005040Fu));
+            continue;
+        }
+        ASSERT_EQ(started, 0);
+        ASSERT_TRUE(recorder.waitForEnd(total));
+        EXPECT_EQ(recorder.reports().back().status, 0);
     }
-    ASSERT_GT(total, 0);
-    Recorder recorder;
-    ReaderWriter* code = ws().open("/Script/Temp/object.txt", tessel::FileCode);
-    ASSERT_EQ(api().download(handle, code, &Recorder::Callback, &recorder), 0);
-    code->release();
-    ASSERT_TRUE(recorder.waitForEnd(total));
-    EXPECT_EQ(recorder.reports().back().status, 0);
+    ASSERT_EQ(run(handle, Immediate(kAlive)), 0);
     ASSERT_EQ(run(handle, Immediate(kBootFirmware)), 0);
-    std::string version;
-    ASSERT_EQ(run(handle, Immediate(kVersion), nullptr, &version), 0);
-    EXPECT_EQ(version, kVersion309);
+    EXPECT_EQ(run(handle, Immediate(Sound(4))), 0);
     char text[tessel::kStatusTextSize];
     EXPECT_EQ(api().status(handle, tessel::StatusBrick, text, sizeof text), 1) << text;
+    ASSERT_EQ(translate("brick version?"), 0);
+    ReaderWriter* code = ws().open("/Script/Temp/object.txt", tessel::FileCode);
+    ReaderWriter* result = ws().open("/Script/Temp/result.txt", tessel::FileResult);
+    Long number = 0;
+    EXPECT_EQ(api().exec(handle, code, &number, result, nullptr, nullptr), 0);
+    EXPECT_EQ(Workspace::ReadHandle(result), kVersion309);
+    result->release();
+    code->release();
     const std::string corrupt =
         ReadHostFile(std::string(TESSEL_RESOURCE_DIR) + "/firmware/corrupt.kvo");
     EXPECT_EQ(translate(corrupt, tessel::FileFirmware), Code(0xE0050415u));

@@ -1,31 +1,28 @@
-// Runs every source file under language/, limits/ and errors/ through the translator and
-// checks the expectations written in its comments:
+// Runs every file under language/, limits/ and errors/ through the translator and checks the
+// expectations in its comments (lines starting with //, ; or #):
 //
 //   expect: ok                            translates
 //   expect error 16 at 42: count          fails with compiler code 16 at offset 42, detail
-//   expect error 16 at "count +": count   ... at the first place that text stands (comments
-//                                         holding expectations do not count)
-//   expect error driver 21 at 0           a driver code (library N: a library code)
-//   expect object: <line>                 a line of the object text
-//   expect listing: <line>                a line of the CSV listing
-//   expect symbol: <line>                 a line of the symbol table
+//   expect error 16 at "count +": count   ... where that text first stands; "driver 21" or
+//                                         "library 148" give other codes; ": detail" is optional
+//   expect object: <line>                 a line of the object text (also listing:, symbol:)
 //   expect commands: 7                    "cmd" occurs 7 times in the object
-//   expect var total = 10                 after running main to its end (or an immediate
-//                                         object; v3 names global 3 in sources without names),
-//   expect sent: 1 2 3                    object), a global's value, the messages sent,
-//   expect sounds: 4                      the system sounds played,
-//   expect tones: 440 50                  the tones (frequency, duration) played
-//   expect requests: 2 4                  the brick requests made (Request numbers)
+//   expect var total = 10                 after running main to its end (or the immediate
+//                                         object): a global's value; v3 is global 3 unnamed
+//   expect sent: 1 2 3                    the messages sent; also sounds:, tones: (frequency,
+//                                         duration) and requests: (Request numbers)
 //   brick: 5                              translate for this brick type (default 6)
 //
-// The source type follows from the extension: .onyx2 script, .opal, .raw, .bin object text,
-// .kvo firmware image. Include files come from include/ here, then from resources/include.
+// The extension gives the source type: .onyx2 script, .opal, .raw, .bin object text, .kvo
+// firmware image. Include files come from include/ here, then from resources/include.
 #include <gtest/gtest.h>
 
 #include <algorithm>
 #include <filesystem>
 #include <fstream>
+#include <iterator>
 #include <map>
+#include <optional>
 #include <regex>
 #include <sstream>
 #include <string>
@@ -44,9 +41,8 @@ namespace {
 
 std::string ReadFile(const fs::path& path)
 {
-    std::ifstream in(path, std::ios::binary);
     std::ostringstream text;
-    text << in.rdbuf();
+    text << std::ifstream(path, std::ios::binary).rdbuf();
     return text.str();
 }
 
@@ -76,84 +72,59 @@ struct Expectations {
     bool error = false;
     std::int32_t code = 0;
     std::string where; // a number or a quoted text
-    bool checkDetail = false;
-    std::string detail;
-    std::vector<std::string> objectLines, listingLines, symbolLines;
-    int commands = -1;
+    std::optional<std::string> detail;
+    std::map<std::string, std::vector<std::string>> lines; // object, listing, symbol
+    std::map<std::string, std::vector<int>> numbers;       // commands, sent, sounds, tones, ...
     std::vector<std::pair<std::string, int>> vars;
-    std::map<std::string, std::vector<int>> effects; // sent, sounds, tones, requests
     int brickType = 6;
 };
-
-std::vector<int> Numbers(const std::string& text)
-{
-    std::vector<int> out;
-    std::istringstream in(text);
-    int n = 0;
-    while (in >> n) {
-        out.push_back(n);
-    }
-    return out;
-}
 
 // Reads the expectations and blanks the comments that hold them, so that a quoted position
 // text is found in the code and not in its own expectation.
 Expectations Parse(std::string& source)
 {
     Expectations e;
-    static const std::regex kLine(R"((//|;|#)\s*(expect|brick:)(.*))");
+    static const std::regex kLine(R"((//|;|#)\s*(expect|brick:)([^\r]*))");
     static const std::regex kError(
         R"(\s*error\s+(driver\s+|library\s+)?(\d+)\s+at\s+(\d+|"[^"]*")(:\s?(.*))?)");
+    static const std::regex kText(R"( (object|listing|symbol): (.*))");
+    static const std::regex kNumbers(R"(\s*(commands|sent|sounds|tones|requests):(.*))");
     static const std::regex kVar(R"(\s*var\s+(\w+)\s*=\s*(-?\d+)\s*)");
-    static const std::regex kEffect(R"(\s*(sent|sounds|tones|requests):(.*))");
-    std::size_t pos = 0;
-    while (pos < source.size()) {
-        std::size_t end = source.find('\n', pos);
-        if (end == std::string::npos) {
-            end = source.size();
-        }
-        std::string line = source.substr(pos, end - pos);
-        if (!line.empty() && line.back() == '\r') {
-            line.pop_back();
-        }
+    for (std::size_t pos = 0, end = 0; pos < source.size(); pos = end + 1) {
+        end = std::min(source.find('\n', pos), source.size());
+        const std::string line = source.substr(pos, end - pos);
         std::smatch m;
-        if (std::regex_search(line, m, kLine)) {
-            const std::string word = m[2];
-            const std::string rest = m[3];
-            if (word == "brick:") {
-                e.brickType = std::stoi(rest);
-            } else if (rest.rfind(": ok", 0) == 0) {
-                e.ok = true;
-            } else if (std::smatch em; std::regex_match(rest, em, kError)) {
-                e.error = true;
-                const int code = std::stoi(em[2]);
-                const std::string kind = em[1];
-                e.code = kind.rfind("driver", 0) == 0    ? DriverError(code)
-                         : kind.rfind("library", 0) == 0 ? LibraryError(code)
-                                                         : CompilerError(code);
-                e.where = em[3];
-                e.checkDetail = em[4].matched;
-                e.detail = em[5];
-            } else if (rest.rfind(" object: ", 0) == 0) {
-                e.objectLines.push_back(rest.substr(9));
-            } else if (rest.rfind(" listing: ", 0) == 0) {
-                e.listingLines.push_back(rest.substr(10));
-            } else if (rest.rfind(" symbol: ", 0) == 0) {
-                e.symbolLines.push_back(rest.substr(9));
-            } else if (rest.rfind(" commands: ", 0) == 0) {
-                e.commands = std::stoi(rest.substr(11));
-            } else if (std::smatch vm; std::regex_match(rest, vm, kVar)) {
-                e.vars.emplace_back(vm[1], std::stoi(vm[2]));
-            } else if (std::smatch fm; std::regex_match(rest, fm, kEffect)) {
-                e.effects[fm[1]] = Numbers(fm[2]);
-            } else {
-                ADD_FAILURE() << "unreadable expectation: " << line;
-            }
-            const std::size_t from = pos + static_cast<std::size_t>(m.position(0));
-            std::fill(source.begin() + static_cast<long>(from),
-                      source.begin() + static_cast<long>(end), ' ');
+        if (!std::regex_search(line, m, kLine)) {
+            continue;
         }
-        pos = end + 1;
+        const std::string rest = m[3];
+        std::smatch x;
+        if (m[2] == "brick:") {
+            e.brickType = std::stoi(rest);
+        } else if (rest.rfind(": ok", 0) == 0) {
+            e.ok = true;
+        } else if (std::regex_match(rest, x, kError)) {
+            e.error = true;
+            const int code = std::stoi(x[2]);
+            e.code = x[1].str().rfind("driver", 0) == 0    ? DriverError(code)
+                     : x[1].str().rfind("library", 0) == 0 ? LibraryError(code)
+                                                           : CompilerError(code);
+            e.where = x[3];
+            if (x[4].matched) {
+                e.detail = x[5];
+            }
+        } else if (std::regex_match(rest, x, kText)) {
+            e.lines[x[1]].push_back(x[2]);
+        } else if (std::regex_match(rest, x, kNumbers)) {
+            std::istringstream in(x[2]);
+            e.numbers[x[1]] = {std::istream_iterator<int>(in), std::istream_iterator<int>()};
+        } else if (std::regex_match(rest, x, kVar)) {
+            e.vars.emplace_back(x[1], std::stoi(x[2]));
+        } else {
+            ADD_FAILURE() << "unreadable expectation: " << line;
+        }
+        std::fill(source.begin() + static_cast<long>(pos + static_cast<std::size_t>(m.position(0))),
+                  source.begin() + static_cast<long>(end), ' ');
     }
     return e;
 }
@@ -162,8 +133,7 @@ std::vector<std::string> Lines(const std::string& text)
 {
     std::vector<std::string> lines;
     std::istringstream in(text);
-    std::string line;
-    while (std::getline(in, line)) {
+    for (std::string line; std::getline(in, line);) {
         if (!line.empty() && line.back() == '\r') {
             line.pop_back();
         }
@@ -183,20 +153,6 @@ void ExpectLines(const std::string& what, const std::string& text,
     }
 }
 
-int SourceTypeOf(const fs::path& path)
-{
-    const std::string ext = path.extension().string();
-    if (ext == ".opal")
-        return SourceOpal;
-    if (ext == ".raw")
-        return SourceRaw;
-    if (ext == ".bin")
-        return SourceObject;
-    if (ext == ".kvo")
-        return SourceFirmware;
-    return SourceScript;
-}
-
 int CountCmd(const std::string& text)
 {
     int count = 0;
@@ -211,9 +167,9 @@ std::vector<fs::path> ScriptFiles()
 {
     std::vector<fs::path> files;
     for (const char* folder : {"language", "limits", "errors"}) {
-        const fs::path dir = fs::path(SIMLANG_TEST_DIR) / folder;
         std::error_code error;
-        for (const auto& entry : fs::directory_iterator(dir, error)) {
+        for (const auto& entry :
+             fs::directory_iterator(fs::path(SIMLANG_TEST_DIR) / folder, error)) {
             if (entry.is_regular_file()) {
                 files.push_back(entry.path());
             }
@@ -229,44 +185,47 @@ TEST_P(ScriptFile, MeetsItsExpectations)
 {
     const fs::path path = GetParam();
     std::string source = ReadFile(path);
-    const Expectations e = Parse(source);
+    Expectations e = Parse(source);
     ASSERT_TRUE(e.ok || e.error) << path << " states neither 'expect: ok' nor an error";
 
+    static const std::map<std::string, int> kTypes = {{".opal", SourceOpal},
+                                                      {".raw", SourceRaw},
+                                                      {".bin", SourceObject},
+                                                      {".kvo", SourceFirmware}};
+    const auto type = kTypes.find(path.extension().string());
     DirectoryIncludes includes;
     Translator translator;
     TranslateRequest request;
     request.brickType = e.brickType;
-    request.sourceType = SourceTypeOf(path);
+    request.sourceType = type == kTypes.end() ? SourceScript : type->second;
     request.source = source;
     request.includes = &includes;
     const TranslateResult result = translator.translate(request);
 
     if (e.error) {
-        std::int32_t where = 0;
+        std::size_t where = 0;
         if (e.where[0] == '"') {
-            const std::string text = e.where.substr(1, e.where.size() - 2);
-            const std::size_t at = source.find(text);
-            ASSERT_NE(at, std::string::npos) << "position text " << e.where << " not in the source";
-            where = static_cast<std::int32_t>(at);
+            where = source.find(e.where.substr(1, e.where.size() - 2));
+            ASSERT_NE(where, std::string::npos) << "position text " << e.where << " not in source";
         } else {
-            where = std::stoi(e.where);
+            where = std::stoul(e.where);
         }
         EXPECT_EQ(result.code, e.code)
             << std::hex << "got 0x" << result.code << " want 0x" << e.code << std::dec
             << " (detail \"" << result.detail << "\")";
-        EXPECT_EQ(result.offset, where);
-        if (e.checkDetail) {
-            EXPECT_EQ(result.detail, e.detail);
+        EXPECT_EQ(result.offset, static_cast<std::int32_t>(where));
+        if (e.detail) {
+            EXPECT_EQ(result.detail, *e.detail);
         }
         EXPECT_TRUE(result.output.empty());
         return;
     }
     ASSERT_EQ(result.code, 0) << std::hex << "0x" << result.code << std::dec << " at "
                               << result.offset << ": " << result.detail;
-    ExpectLines("object", result.output, e.objectLines);
-    ExpectLines("symbol table", result.symbols, e.symbolLines);
-    if (e.commands >= 0) {
-        EXPECT_EQ(CountCmd(result.output), e.commands) << result.output;
+    ExpectLines("object", result.output, e.lines["object"]);
+    ExpectLines("symbol table", result.symbols, e.lines["symbol"]);
+    if (auto commands = e.numbers.find("commands"); commands != e.numbers.end()) {
+        EXPECT_EQ(CountCmd(result.output), commands->second.at(0)) << result.output;
     }
     // The object must read back, and count as many commands as "cmd" markers.
     Program program;
@@ -274,15 +233,14 @@ TEST_P(ScriptFile, MeetsItsExpectations)
     ASSERT_EQ(parsed.code, 0) << parsed.detail << " at " << parsed.offset << " in\n"
                               << result.output;
     EXPECT_EQ(program.commandCount, CountCmd(result.output));
-
-    if (!e.listingLines.empty()) {
+    if (!e.lines["listing"].empty()) {
         request.targetType = TargetListing;
         const TranslateResult listing = translator.translate(request);
         ASSERT_EQ(listing.code, 0);
-        ExpectLines("listing", listing.output, e.listingLines);
+        ExpectLines("listing", listing.output, e.lines["listing"]);
     }
 
-    if (e.vars.empty() && e.effects.empty()) {
+    if (e.vars.empty() && e.numbers.size() == e.numbers.count("commands")) {
         return;
     }
     simlang_test::FakeHost host(&program);
@@ -298,18 +256,14 @@ TEST_P(ScriptFile, MeetsItsExpectations)
         EXPECT_EQ(machine.lastFault(), 0);
     }
     for (const auto& [name, value] : e.vars) {
-        const std::string prefix = "var,";
-        const std::vector<std::string> symbols = Lines(result.symbols);
         int index = -1;
-        for (const std::string& line : symbols) {
-            const std::size_t comma = line.rfind(',');
-            if (line.rfind(prefix, 0) == 0 && line.substr(comma + 1) == name) {
-                index = std::stoi(line.substr(prefix.size()));
+        for (const std::string& line : Lines(result.symbols)) {
+            if (line.rfind("var,", 0) == 0 && line.substr(line.rfind(',') + 1) == name) {
+                index = std::stoi(line.substr(4));
             }
         }
-        if (index < 0 && name.size() > 1 && name[0] == 'v' &&
-            std::isdigit(static_cast<unsigned char>(name[1]))) {
-            index = std::stoi(name.substr(1)); // sources without names: v<index>
+        if (index < 0 && std::regex_match(name, std::regex(R"(v\d+)"))) {
+            index = std::stoi(name.substr(1)); // sources without names
         }
         ASSERT_GE(index, 0) << "no variable " << name;
         EXPECT_EQ(host.variables[index], value) << "variable " << name;
@@ -318,8 +272,10 @@ TEST_P(ScriptFile, MeetsItsExpectations)
                                                           {"sounds", host.sounds},
                                                           {"tones", host.tones},
                                                           {"requests", host.requests}};
-    for (const auto& [what, wanted] : e.effects) {
-        EXPECT_EQ(seen.at(what), wanted) << what;
+    for (const auto& [what, wanted] : e.numbers) {
+        if (what != "commands") {
+            EXPECT_EQ(seen.at(what), wanted) << what;
+        }
     }
 }
 
@@ -327,11 +283,8 @@ std::string TestName(const testing::TestParamInfo<fs::path>& info)
 {
     std::string name = info.param.parent_path().filename().string() + "_" +
                        info.param.stem().string() + "_" + info.param.extension().string().substr(1);
-    for (char& c : name) {
-        if (!std::isalnum(static_cast<unsigned char>(c))) {
-            c = '_';
-        }
-    }
+    std::replace_if(
+        name.begin(), name.end(), [](unsigned char c) { return !std::isalnum(c); }, '_');
     return name;
 }
 
