@@ -127,30 +127,18 @@ void DialogFixture::TearDown()
 
 void DialogFixture::Settle()
 {
-    Pump([this] { return dialog_->operationsInFlight() == 0 && host_->QueuedMessages() == 0; },
-         "a download or execution never reported back");
+    PumpUntil(
+        [this] { return dialog_->operationsInFlight() == 0 && host_->QueuedMessages() == 0; });
 }
 
-void DialogFixture::WaitForStatuses(std::size_t count, bool (*accept)(const std::string&))
-{
-    Pump(
-        [this, count, accept] {
-            std::size_t seen = 0;
-            for (const std::string& status : Statuses())
-                seen += accept(status) ? 1 : 0;
-            return seen >= count;
-        },
-        "not all expected texts arrived");
-}
-
-void DialogFixture::Pump(const std::function<bool()>& done, const char* hang)
+void DialogFixture::PumpUntil(const std::function<bool()>& done)
 {
     for (;;) {
         host_->DispatchPending();
         if (done())
             return;
         if (!host_->WaitForMessage(kHangMs)) {
-            ADD_FAILURE() << hang;
+            ADD_FAILURE() << "a report expected from the library never came";
             return;
         }
     }

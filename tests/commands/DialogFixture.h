@@ -72,10 +72,10 @@ protected:
     void SelectSource(int index) { host_->ListSelect(window(), ui::IdSourceList, index); }
     void SelectBrick(int index) { host_->ListSelect(window(), ui::IdBrickList, index); }
 
-    // Handles posted reports until nothing is in flight or queued; fails on a hang.
+    // Handles posted reports until done; fails when none arrives for long (a hang).
+    void PumpUntil(const std::function<bool()>& done);
+    // Handles posted reports until nothing is in flight or queued.
     void Settle();
-    // Handles posted reports until count status texts satisfy accept; fails on a hang.
-    void WaitForStatuses(std::size_t count, bool (*accept)(const std::string&));
 
     std::vector<ui::HeadlessEvent> EventsOf(ui::HeadlessEvent::Kind kind) const;
     std::vector<std::string> Statuses() const;
@@ -96,8 +96,6 @@ protected:
     bool settleOnTearDown_ = true;
 
 private:
-    void Pump(const std::function<bool()>& done, const char* hang);
-
     std::filesystem::path dir_;
     std::unique_ptr<ui::HeadlessHost> host_;
     std::unique_ptr<ui::TestClientDialog> dialog_;

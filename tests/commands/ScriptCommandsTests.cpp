@@ -1,9 +1,5 @@
-// Validate, Execute, Execute Async, Download, Download File, Receive and the reports that the
-// library's callbacks post, against the simulated library. Status texts and offers of the failure
-// table are the fault matrix's; these follow what the dialog does around them.
-//
-// Where a test is about the dialog rather than the language, the editor holds object text
-// with the Source list on BIN, which the library takes as code without translating it.
+// Validate, Execute, Execute Async, Download, Download File, Receive and the reports posted by
+// the library's callbacks. Object text with the Source list on BIN skips the translation.
 #include <string>
 
 #include "DialogFixture.h"
@@ -268,8 +264,7 @@ TEST_F(ScriptCommands, ReceptionShowsEachMessageInTurnUntilSwitchedOff)
     ASSERT_FALSE(host().IsControlVisible(window(), ui::IdReceive)); // hidden, but clickable
     Click(ui::IdReceive);
     EXPECT_TRUE(dialog().receiving());
-    WaitForStatuses(
-        3, [](const std::string& text) { return text.rfind("Received PBMessage: ", 0) == 0; });
+    PumpUntil([this] { return Statuses().size() >= 3; });
     EXPECT_EQ(Statuses(),
               (Texts{"Received PBMessage: 3", "Received PBMessage: 7", "Received PBMessage: 9"}));
     // A bad message is shown without a beep.

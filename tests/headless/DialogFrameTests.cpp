@@ -387,14 +387,6 @@ TEST_F(RecordingFrame, TeardownSwitchesReceptionOffBeforeDestroyingTheHandle)
     EXPECT_EQ(calls(tessel::SlotTerminate).count, 1);
 }
 
-TEST_F(RecordingFrame, TeardownWithoutReceptionOnlyDestroys)
-{
-    StartWithHandle(5, "[PORTS]\nSerial=S1\n");
-    host().SendMessage(window(), kMsgCommand, MakeCommand(IdFileExit), 0);
-    EXPECT_EQ(calls(tessel::SlotExec).count, 0);
-    EXPECT_EQ(calls(tessel::SlotDestroy).count, 1);
-}
-
 TEST_F(RecordingFrame, AsyncExecutionResultNumberLivesInTheDialog)
 {
     StartWithHandle(9);
