@@ -44,13 +44,15 @@ Program Compile(const std::string& source, int sourceType = SourceScript)
     return program;
 }
 
+using Report = std::tuple<std::int32_t, std::int32_t, std::string>; // code, offset, detail
+
 class RecordingDiagnostics : public Diagnostics {
 public:
     void report(std::int32_t code, std::int32_t offset, const char* detail) override
     {
         reports.emplace_back(code, offset, detail);
     }
-    std::vector<std::tuple<std::int32_t, std::int32_t, std::string>> reports;
+    std::vector<Report> reports;
 };
 
 TEST(Translator, ReportsAFailureOnceAndSuccessNotAtAll)
@@ -64,9 +66,8 @@ TEST(Translator, ReportsAFailureOnceAndSuccessNotAtAll)
     EXPECT_EQ(static_cast<std::uint32_t>(translator.translate(request).code), 0xE0050810u);
     request.source = "sound 4";
     EXPECT_EQ(translator.translate(request).code, 0);
-    const std::int32_t speed = static_cast<std::int32_t>(source.find("speed"));
-    EXPECT_EQ(diagnostics.reports, (decltype(diagnostics.reports){
-                                       {static_cast<std::int32_t>(0xE0050810u), speed, "speed"}}));
+    const auto speed = static_cast<std::int32_t>(source.find("speed"));
+    EXPECT_EQ(diagnostics.reports, (std::vector<Report>{{CompilerError(16), speed, "speed"}}));
 }
 
 TEST(Translator, UnknownTypesAndBrickTypesWithoutALanguageAreRefused)
