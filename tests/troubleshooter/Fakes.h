@@ -13,6 +13,7 @@
 #include <string>
 #include <vector>
 
+#include "platform/SystemInfoScripted.h"
 #include "troubleshooter/BrickCalls.h"
 #include "troubleshooter/HelpViewer.h"
 #include "troubleshooter/OutcomeView.h"
@@ -241,4 +242,13 @@ private:
         calls.push_back(call);
         return answer;
     }
+};
+
+// A log, scripted brick calls and system, and the dialog's handle slot holding 5.
+class ShooterFixture : public testing::Test {
+protected:
+    TempLog log;
+    FakeBrickCalls calls;
+    platform::ScriptedSystemInfo system;
+    tessel::Long handle = 5;
 };

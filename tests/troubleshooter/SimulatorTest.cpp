@@ -1,20 +1,198 @@
-// The dialog's Trouble Shooter offers on the headless host against the simulated library,
-// with the headless help viewer showing the topics and the help commands sent as its links
-// would send them.
+// Against the simulated library, which each test loads by absolute path from the folder it
+// was built into: the diagnosis through the dialog's session adapter, and the dialog's offers
+// on the headless host with the headless help viewer following the help's links.
 #include <gtest/gtest.h>
+#include <unistd.h>
 
+#include <cstdlib>
 #include <deque>
+#include <filesystem>
+#include <fstream>
+#include <memory>
 #include <string>
 #include <utility>
 #include <vector>
 
 #include "Fakes.h"
-#include "SimulatorFixture.h"
+#include "errors/ErrorText.h"
+#include "platform/SystemInfoScripted.h"
+#include "session/BrickSession.h"
 #include "troubleshooter/HeadlessHelpViewer.h"
+#include "troubleshooter/SessionBrickCalls.h"
+#include "troubleshooter/TroubleShooter.h"
 #include "ui/TestClientDialog.h"
 #include "ui/headless/HeadlessHost.h"
+#include "workspace/LiveObjects.h"
+
+#ifndef HARBOR_SIM_DIR
+#define HARBOR_SIM_DIR ""
+#endif
 
 namespace {
+
+// Each test writes its scenario and settings into a directory of its own; no workspace object
+// may outlive a test.
+class SimulatorFixture : public testing::Test {
+protected:
+    void SetUp() override
+    {
+        static int number = 0;
+        dir_ = std::filesystem::temp_directory_path() /
+               ("harbor-shooter-" + std::to_string(getpid()) + "-" + std::to_string(++number));
+        std::filesystem::remove_all(dir_);
+        std::filesystem::create_directories(dir_);
+        ASSERT_NE(std::string(HARBOR_SIM_DIR), "") << "the simulated library is not built";
+    }
+    void TearDown() override
+    {
+        session_.reset();
+        EXPECT_EQ(workspace::LiveObjectCount(), 0);
+        std::error_code ignored;
+        std::filesystem::remove_all(dir_, ignored);
+    }
+
+    // Writes the scenario (link time 0 is added) and the settings, with lines of the test's own.
+    void WriteScenario(const std::string& scenario, const std::string& settings = "")
+    {
+        ::setenv("TESSEL_SIM", WriteFile("scenario.txt", "link-time = 0\n" + scenario).c_str(), 1);
+        WriteFile("harbor.ini", "[PATHS]\nDLL=" + std::string(HARBOR_SIM_DIR) +
+                                    "/\n[DEBUG]\nMEMFILES=TRUE\n" + settings);
+    }
+    void Start(const std::string& scenario)
+    {
+        WriteScenario(scenario);
+        session_ = std::make_unique<BrickSession>((dir_ / "harbor.ini").string().c_str());
+        ASSERT_TRUE(session_->libraryLoaded()) << "Tessel.dll not found in " HARBOR_SIM_DIR;
+    }
+    std::string LogPath() const { return (dir_ / "shooter.log").string(); }
+    std::string Log() const
+    {
+        std::ifstream in(LogPath(), std::ios::binary);
+        return std::string(std::istreambuf_iterator<char>(in), std::istreambuf_iterator<char>());
+    }
+    std::string WriteFile(const std::string& name, const std::string& bytes)
+    {
+        const std::string path = (dir_ / name).string();
+        std::ofstream(path, std::ios::binary) << bytes;
+        return path;
+    }
+
+    BrickSession& session() { return *session_; }
+    BrickSession* sessionSlot_ = nullptr; // the dialog's pointer, as the adapter reads it
+    std::filesystem::path dir_;
+    std::unique_ptr<BrickSession> session_;
+};
+
+class SimulatedDiagnosis : public SimulatorFixture {
+protected:
+    void Open(const char* port)
+    {
+        sessionSlot_ = session_.get();
+        handle = session().Create(port);
+        ASSERT_NE(handle, 0) << port;
+        calls = std::make_unique<SessionBrickCalls>(&sessionSlot_);
+        shooter =
+            std::make_unique<TroubleShooter>(calls.get(), &handle, LogPath().c_str(), &system);
+    }
+    std::string Body() const
+    {
+        const std::string log = Log();
+        return log.substr(log.find("\n\n") + 2);
+    }
+
+    platform::ScriptedSystemInfo system;
+    tessel::Long handle = 0;
+    std::unique_ptr<SessionBrickCalls> calls;
+    std::unique_ptr<TroubleShooter> shooter;
+    RecordingView view;
+};
+
+TEST_F(SimulatedDiagnosis, UnpluggedUsbTowerIsFoundAgain)
+{
+    Start("[brick onyx2]\n[port KIVOTOWER1]\nunplug-after = 0\n");
+    Open("KIVOTOWER1");
+    const tessel::Long failed = session().RunImmediate(handle, "sound 4", nullptr);
+    ASSERT_EQ(failed, Packed(0xE0050474u)) << "the tower should be unplugged now";
+    const tessel::Long lost = handle;
+
+    shooter->Diagnose(failed, &view);
+    EXPECT_EQ(view.shown, std::vector<int>{1105});
+    EXPECT_NE(handle, lost);
+    EXPECT_EQ(session().Status(handle, tessel::StatusPort, nullptr, 0), 1);
+    EXPECT_EQ(Body(),
+              "Computer: BENCH-PC\nUser name: tester\nProcessor Type: 586 (1)\n"
+              "Linux version 6.1.0-test (x86_64)\n"
+              "\tDiagnosing Error failed:\n"
+              "\t\tError (0xe0050474) from Tessel driver: Kivo USB Tower has been unplugged from "
+              "this port\n"
+              "\nGet Tower Type:\n\tGet port name ok\n\tPort 3 is KIVOTOWER1\n"
+              "\nFind USB Tower:\n\tFind port ok\n\tCreate port KIVOTOWER1 ok\n"
+              "\tSet brick type ok\n\tPort status ok\n"
+              "\nGet Tower Type:\n\tGet port name ok\n\tPort 3 is KIVOTOWER1\n"
+              "\tFind USB tower ok\n");
+    session().Destroy(handle);
+}
+
+TEST_F(SimulatedDiagnosis, ComPortNamedInsteadOfTheUsbTower)
+{
+    Start("[brick onyx2]\n[port KIVOTOWER1]\ntower = no\n[port COM1]\n");
+    Open("KIVOTOWER1");
+    EXPECT_TRUE(shooter->Diagnose(Packed(0xE005040Bu), &view));
+    // The port state (no tower) decides, not the given tower fault.
+    EXPECT_EQ(view.shown, std::vector<int>{1002});
+    EXPECT_NE(Body().find("\nFind USB Tower:\n\tFind port ok\n\tFind USB tower failed:\n"
+                          "\t\tError (0xe0050444) from Tessel driver: no more ports found\n"),
+              std::string::npos);
+    EXPECT_EQ(handle, 0) << "the search closed the old port and opened none";
+}
+
+// Outcomes that depend on the port type or have no catalogue text, and a facility that has
+// no outcome at all, which is logged under its jump label instead.
+TEST_F(SimulatedDiagnosis, OutcomeEdgeCases)
+{
+    struct Case {
+        const char* port;
+        std::uint32_t error;
+        std::vector<int> shown;
+        const char* logged;
+    };
+    const Case cases[] = {
+        {"KIVOTOWER1", 0xE0050C52u, {1102}, nullptr},
+        {"COM1", 0xE0050C52u, {1002}, nullptr},
+        {"KIVOTOWER1",
+         0xE0050476u,
+         {1103},
+         "\tDiagnosing Error failed:\n\t\tError (0xe0050476) from Tessel driver: "},
+        {"COM1",
+         0xE0030010u,
+         {},
+         "\tJump facility failed:\n\t\tError (0xe0030010) from Opal: undefined label\n"},
+    };
+    Start("[brick onyx2]\n[port KIVOTOWER1]\n[port COM1]\n");
+    for (const Case& c : cases) {
+        SCOPED_TRACE(std::string(c.port) + " " + std::to_string(c.error));
+        Open(c.port);
+        view.shown.clear();
+        EXPECT_EQ(shooter->Diagnose(Packed(c.error), &view), !c.shown.empty());
+        EXPECT_EQ(view.shown, c.shown);
+        EXPECT_EQ(Body().find("Find USB Tower"), std::string::npos) << "the tower answers";
+        if (c.logged != nullptr) {
+            EXPECT_NE(Body().find(c.logged), std::string::npos) << Body();
+        }
+        session().Destroy(handle);
+    }
+}
+
+TEST_F(SimulatedDiagnosis, CallsAfterTheSessionIsGoneFailQuietly)
+{
+    Start("[brick onyx2]\n[port COM1]\n");
+    Open("COM1");
+    session().Destroy(handle);
+    session_.reset();
+    sessionSlot_ = nullptr;
+    EXPECT_EQ(shooter->TestTower(), StatusToError(tessel::kStatusNoLibrary));
+    EXPECT_EQ(shooter->FindTower(), Packed(tessel::kLinkFailed));
+}
 
 // A "link" that starts a second run with its argument as the error.
 constexpr int kNestedRun = -1;
