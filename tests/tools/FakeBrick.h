@@ -1,7 +1,5 @@
-// A scripted Onyx2 behind the tools' BrickAccess seam: 64 KB of memory, a memory map, fixed
-// answers for the single-value queries and scripted enumerations. It keeps one result file
-// that every execution empties and refills, as the session's result working file is, and
-// records every command text it is asked to translate.
+// A scripted Onyx2 behind BrickAccess: memory, memory map, fixed answers and enumerations; one
+// result file every execution empties and refills, as the session's is; every command recorded.
 #pragma once
 
 #include <algorithm>
@@ -39,7 +37,6 @@ public:
     FakeBrick() { resultEntry_->addRef(); }
     ~FakeBrick() override { resultEntry_->release(); }
 
-    // --- the scripted brick -----------------------------------------------------------
     bool brickTypeFails = false;
     bool usb = false; // else a serial tower on COM1
     std::map<tessel::Short, tessel::Short> properties = {{4, 3},   {5, 5},   {6, 250}, {7, 50},
@@ -96,7 +93,6 @@ public:
         return list;
     }
 
-    // --- BrickAccess ----------------------------------------------------------------------
     tessel::Long Get(tessel::Long, tessel::Short property, tessel::Short* value, char* text,
                      tessel::Size size) override
     {
