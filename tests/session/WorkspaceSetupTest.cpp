@@ -77,10 +77,8 @@ TEST_F(WorkspaceSetup, HeadersAreMountedUnderLowerCaseNamesOnly)
         ++count;
     }
     EXPECT_EQ(count, 2);
-}
 
-TEST_F(WorkspaceSetup, HeaderListBeyondTheKeyBufferIsCutNotOverrun)
-{
+    // A header list beyond the key buffer is cut, not overrun.
     std::string headers = "[HEADERS]\n";
     for (int i = 0; i < 200; ++i) {
         headers += "key" + std::to_string(i) + "=h" + std::to_string(i) + ".h\n";
