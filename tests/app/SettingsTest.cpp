@@ -10,7 +10,8 @@
 
 namespace {
 
-TEST(DialogSettingsReading, EveryKeyOrItsDefaultWhenTheFileIsMissing)
+// Each key reaching the dialog is checked with the dialog; here the defaults and the bounds.
+TEST(DialogSettingsReading, MissingFileGivesDefaultsAndLongValuesAreCutToTheirBuffers)
 {
     testsupport::TempDirectory dir;
     const auto absent = app::ReadDialogSettings((dir.path() + "absent.ini").c_str());
@@ -20,22 +21,6 @@ TEST(DialogSettingsReading, EveryKeyOrItsDefaultWhenTheFileIsMissing)
     }
     EXPECT_FALSE(absent.autoRun || absent.autoClear || absent.autoDownload);
 
-    const std::string path =
-        dir.write("h.ini", "[FIRMWARE]\nSOURCE=fw.kvo\n[PATHS]\nFIRMWARE=/fw/\n"
-                           "[PORTS]\nserial=COM1\nUSB=USB0\n[OPTIONS]\nAUTORUN=True\n"
-                           "AUTOCLEAR=tRuE\nAUTODOWNLOAD=true\n[DEBUG]\nLOGFILE=log.txt\n");
-    const auto settings = app::ReadDialogSettings(path.c_str());
-    EXPECT_STREQ(settings.firmwareFile, "fw.kvo");
-    EXPECT_STREQ(settings.firmwareDir, "/fw/");
-    EXPECT_STREQ(settings.serialPort, "COM1");
-    EXPECT_STREQ(settings.usbPort, "USB0");
-    EXPECT_STREQ(settings.logFile, "log.txt");
-    EXPECT_TRUE(settings.autoRun && settings.autoClear && settings.autoDownload);
-}
-
-TEST(DialogSettingsReading, LongValuesAreCutToTheirBuffers)
-{
-    testsupport::TempDirectory dir;
     const std::string longPort(400, 'p');
     const std::string path =
         dir.write("h.ini", "[PORTS]\nUSB=" + longPort + "\n[OPTIONS]\nAUTORUN=true" +
@@ -80,54 +65,44 @@ TEST(TraceOptions, LeadingDecimalNumberKeptToItsLowSixteenBitsAsSigned)
 
 // The trace option goes to the library through the session: the recording library shows
 // whether and how Set was called.
-class TraceOption : public ::testing::Test {
-protected:
-    std::string Settings(const std::string& trace)
-    {
+TEST(TraceOption, NonZeroOptionsWriteHeaderAndSetPropertyFifteenZeroDoesNothing)
+{
+    testsupport::RecordingLibrary library;
+    ASSERT_TRUE(library.loaded());
+    testsupport::TempDirectory dir;
+    const RecordedCall& set = library.state().calls[tessel::SlotSet];
+    const auto settings = [&](const std::string& trace) {
         return dir.write("h.ini", "[PATHS]\nDLL=" + testsupport::RecordingLibraryDirectory() +
                                       "\n[DEBUG]\nMEMFILES=TRUE\nTRACE=" + trace + "\n");
-    }
-    const RecordedCall& set() { return library.state().calls[tessel::SlotSet]; }
-
-    testsupport::RecordingLibrary library;
-    testsupport::TempDirectory dir;
-};
-
-TEST_F(TraceOption, NonZeroOptionsWriteHeaderAndSetPropertyFifteen)
-{
-    ASSERT_TRUE(library.loaded());
-    const std::string settings = Settings("70000");
+    };
+    EXPECT_EQ(app::ReadTraceOptions((dir.path() + "absent.ini").c_str()), 0);
     {
-        BrickSession session(settings.c_str());
-        const std::int16_t options = app::ReadTraceOptions(settings.c_str());
+        const std::string path = settings("");
+        BrickSession session(path.c_str());
+        EXPECT_EQ(app::ReadTraceOptions(path.c_str()), 0);
+        app::ApplyTraceOptions(session, 0, (dir.path() + "tsltrace.txt").c_str());
+        EXPECT_EQ(set.count, 0);
+        EXPECT_FALSE(std::filesystem::exists(dir.path() + "tsltrace.txt"));
+    }
+    const std::string path = settings("70000");
+    {
+        BrickSession session(path.c_str());
+        const std::int16_t options = app::ReadTraceOptions(path.c_str());
         EXPECT_EQ(options, 4464);
         app::ApplyTraceOptions(session, options, (dir.path() + "tsltrace.txt").c_str());
-        ASSERT_EQ(set().count, 1);
-        EXPECT_EQ(set().numbers[0], 0);
-        EXPECT_EQ(set().numbers[1], 15);
-        EXPECT_EQ(set().numbers[2], 4464);
+        ASSERT_EQ(set.count, 1);
+        EXPECT_EQ(set.numbers[0], 0);
+        EXPECT_EQ(set.numbers[1], 15);
+        EXPECT_EQ(set.numbers[2], 4464);
     }
     EXPECT_EQ(dir.read("tsltrace.txt"), "Trace file \"tsltrace.txt\", options: 4464\n\n");
     EXPECT_EQ(workspace::LiveObjectCount(), 0);
 
     // A trace file that cannot be written still switches tracing on.
-    BrickSession session(settings.c_str());
+    BrickSession session(path.c_str());
     app::ApplyTraceOptions(session, -2, (dir.path() + "no/such/dir/tsltrace.txt").c_str());
-    EXPECT_EQ(set().count, 2);
-    EXPECT_EQ(set().numbers[2], -2);
-}
-
-TEST_F(TraceOption, ZeroOrMissingOptionsWriteNothingAndCallNothing)
-{
-    ASSERT_TRUE(library.loaded());
-    EXPECT_EQ(app::ReadTraceOptions((dir.path() + "absent.ini").c_str()), 0);
-    const std::string settings = Settings("");
-    BrickSession session(settings.c_str());
-    const std::int16_t options = app::ReadTraceOptions(settings.c_str());
-    EXPECT_EQ(options, 0);
-    app::ApplyTraceOptions(session, options, (dir.path() + "tsltrace.txt").c_str());
-    EXPECT_EQ(set().count, 0);
-    EXPECT_FALSE(std::filesystem::exists(dir.path() + "tsltrace.txt"));
+    EXPECT_EQ(set.count, 2);
+    EXPECT_EQ(set.numbers[2], -2);
 }
 
 } // namespace

@@ -10,35 +10,49 @@
 #include <QSignalSpy>
 #include <QTest>
 
+#include <memory>
+
 #include "ui/TestClientDialog.h"
 #include "ui/qt/DialogWindow.h"
 #include "ui/qt/HostStyle.h"
 
 using ui::DialogWindow;
 
-namespace {
-
-const ui::DialogTemplate& Layout()
-{
-    return ui::TestClientDialogTemplate();
-}
-
-} // namespace
-
 class tst_DialogWindow : public QObject {
     Q_OBJECT
 
 private slots:
+    void init();
     void windowAndControls();
     void menu();
-    void controlsSendTheirCommands();
+    void checkBoxEscapeAndCloseBox();
     void hostStyleDrawsTheSameArrows();
+
+private:
+    // True if exactly one command went out since the last call, and it was id.
+    bool sentOnly(int id)
+    {
+        const bool once = commands_->count() == 1 && commands_->at(0).at(0).toInt() == id;
+        commands_->clear();
+        return once;
+    }
+
+    const ui::DialogTemplate& layout_ = ui::TestClientDialogTemplate();
+    std::unique_ptr<DialogWindow> window_;
+    std::unique_ptr<QSignalSpy> commands_;
 };
+
+void tst_DialogWindow::init()
+{
+    window_ = std::make_unique<DialogWindow>(layout_);
+    window_->show();
+    QVERIFY(QTest::qWaitForWindowExposed(window_.get()));
+    commands_ = std::make_unique<QSignalSpy>(window_.get(), &DialogWindow::commandIssued);
+}
 
 void tst_DialogWindow::windowAndControls()
 {
-    DialogWindow window(Layout());
-    window.show();
+    DialogWindow& window = *window_;
     QCOMPARE(window.windowTitle(), QStringLiteral("Tessel Test Client"));
     // 372 by 289 dialog units of the dialog font; minimise box only, fixed size.
     QCOMPARE(window.centralWidget()->size(), QSize(window.pixelsX(372), window.pixelsY(289)));
@@ -48,12 +62,13 @@ void tst_DialogWindow::windowAndControls()
     QCOMPARE(window.minimumSize(), window.maximumSize());
 
     // Each control of the template as the widget of its kind, with its caption and state;
-    // check boxes and radio buttons start unchecked, the dialog's start sets them.
+    // check boxes and radio buttons start unchecked, the dialog's start sets them. Every
+    // button sends its id, hidden ones too.
     const char* const classes[] = {"QLabel",    "QGroupBox", "QLineEdit",    "QPlainTextEdit",
                                    "QComboBox", "QCheckBox", "QRadioButton", "QPushButton"};
     QList<int> ids;
-    for (int i = 0; i < Layout().controlCount; ++i) {
-        const ui::ControlSpec& spec = Layout().controls[i];
+    for (int i = 0; i < layout_.controlCount; ++i) {
+        const ui::ControlSpec& spec = layout_.controls[i];
         if (spec.id == ui::kNoControlId)
             continue;
         ids << spec.id;
@@ -75,6 +90,10 @@ void tst_DialogWindow::windowAndControls()
         QVERIFY2(widget->isEnabled() != bool(spec.style & ui::StyleDisabled), row);
         const bool visible = !(spec.style & ui::StyleHidden);
         QVERIFY2(widget->isVisible() == visible && widget->isHidden() != visible, row);
+        if (auto* button = qobject_cast<QPushButton*>(widget)) {
+            button->click();
+            QVERIFY2(sentOnly(spec.id), row);
+        }
     }
     QCOMPARE(ids.size(), 26);
     const QRect client = window.centralWidget()->rect();
@@ -100,14 +119,14 @@ void tst_DialogWindow::windowAndControls()
     QCOMPARE(status->horizontalScrollBarPolicy(), Qt::ScrollBarAlwaysOff);
 }
 
-// The menu bar holds the template's menus and items in order, greyed where it says.
+// The menu bar holds the template's menus and items in order, each sending its id; a greyed
+// item sends nothing, yet is wired for when the dialog enables it.
 void tst_DialogWindow::menu()
 {
-    DialogWindow window(Layout());
-    const QList<QAction*> menus = window.menuBar()->actions();
-    QCOMPARE(menus.size(), Layout().menuCount);
-    for (int m = 0; m < Layout().menuCount; ++m) {
-        const ui::MenuSpec& spec = Layout().menus[m];
+    const QList<QAction*> menus = window_->menuBar()->actions();
+    QCOMPARE(menus.size(), layout_.menuCount);
+    for (int m = 0; m < layout_.menuCount; ++m) {
+        const ui::MenuSpec& spec = layout_.menus[m];
         QCOMPARE(menus[m]->text(), QString::fromLatin1(spec.caption));
         const QList<QAction*> items = menus[m]->menu()->actions();
         QCOMPARE(items.size(), spec.itemCount);
@@ -118,62 +137,35 @@ void tst_DialogWindow::menu()
                 continue;
             QCOMPARE(items[i]->text(), QString::fromLatin1(item.caption));
             QCOMPARE(items[i]->property("commandId").toInt(), item.id);
+            QCOMPARE(window_->menuAction(item.id), items[i]);
             QCOMPARE(items[i]->isEnabled(), !item.greyed);
-            QCOMPARE(window.menuAction(item.id), items[i]);
+            items[i]->trigger();
+            QCOMPARE(commands_->count(), item.greyed ? 0 : 1);
+            items[i]->setEnabled(true);
+            commands_->clear();
+            items[i]->trigger();
+            QVERIFY(sentOnly(item.id));
         }
     }
 }
 
-void tst_DialogWindow::controlsSendTheirCommands()
+void tst_DialogWindow::checkBoxEscapeAndCloseBox()
 {
-    DialogWindow window(Layout());
-    window.show();
-    QVERIFY(QTest::qWaitForWindowExposed(&window));
-    QSignalSpy commands(&window, &DialogWindow::commandIssued);
-    const auto sentOnly = [&](int id) {
-        const bool once = commands.count() == 1 && commands.at(0).at(0).toInt() == id;
-        commands.clear();
-        return once;
-    };
-    // Every button sends its id, hidden ones too.
-    for (int id : window.controlIds()) {
-        if (auto* button = qobject_cast<QPushButton*>(window.control(id))) {
-            button->click();
-            QVERIFY2(sentOnly(id), qPrintable(QString::number(id)));
-        }
-    }
-    // So does every menu item; a greyed one sends nothing, yet is wired for when the dialog
-    // enables it.
-    for (int m = 0; m < Layout().menuCount; ++m) {
-        for (int i = 0; i < Layout().menus[m].itemCount; ++i) {
-            const ui::MenuItemSpec& spec = Layout().menus[m].items[i];
-            QAction* item = window.menuAction(spec.id);
-            if (item == nullptr)
-                continue;
-            item->trigger();
-            QCOMPARE(commands.count(), spec.greyed ? 0 : 1);
-            item->setEnabled(true);
-            commands.clear();
-            item->trigger();
-            QVERIFY2(sentOnly(spec.id), qPrintable(QString::number(spec.id)));
-        }
-    }
-
     // A check box is toggled before its command goes out.
-    auto* autoRun = qobject_cast<QCheckBox*>(window.control(223));
+    auto* autoRun = qobject_cast<QCheckBox*>(window_->control(223));
     bool checkedWhenSent = false;
-    connect(&window, &DialogWindow::commandIssued, this,
+    connect(window_.get(), &DialogWindow::commandIssued, this,
             [&](int id) { checkedWhenSent = id == 223 && autoRun->isChecked(); });
     QTest::mouseClick(autoRun, Qt::LeftButton, {}, QPoint(4, autoRun->height() / 2));
     QVERIFY(autoRun->isChecked() && checkedWhenSent && sentOnly(223));
 
     // Escape and the close box both send Cancel; the dialog decides, so the window stays.
-    QTest::keyClick(window.control(1015), Qt::Key_Escape);
+    QTest::keyClick(window_->control(1015), Qt::Key_Escape);
     QVERIFY(sentOnly(ui::kIdCancel));
-    QVERIFY(!window.close());
-    QVERIFY(window.isVisible() && sentOnly(ui::kIdCancel));
-    window.allowClose();
-    QVERIFY(window.close());
+    QVERIFY(!window_->close());
+    QVERIFY(window_->isVisible() && sentOnly(ui::kIdCancel));
+    window_->allowClose();
+    QVERIFY(window_->close());
 }
 
 // The host style only puts off loading the menu bar's overflow arrows: once painted, they are

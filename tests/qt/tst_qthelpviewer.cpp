@@ -166,6 +166,9 @@ void tst_QtHelpViewer::troubleShooterRunFollowsLinks()
         QVERIFY(run.offer());
         QVERIFY(!run.viewer.IsOpen());
         QCOMPARE(run.answerer.questions.size(), std::size_t(1));
+        QCOMPARE(run.answerer.questions[0].caption, QStringLiteral("Diagnostics"));
+        QCOMPARE(run.answerer.questions[0].owner,
+                 static_cast<QWidget*>(run.host.dialogWindow(run.dialog.handle())));
         QCOMPARE(run.answerer.questions[0].text,
                  QStringLiteral("Error (0xe0050421) from Tessel driver: "
                                 "IDSTATUS_RESULT_NOTOWER.\nUse Trouble Shooter?"));

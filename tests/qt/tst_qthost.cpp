@@ -289,6 +289,8 @@ void tst_QtHost::answerer()
     QVERIFY(!host_->ChooseOpenFile(request));
     QVERIFY(!host_->ChooseSaveFile(request));
     QCOMPARE(QByteArray(path), QByteArray("keep"));
+    QCOMPARE(answerer.fileDialogs.back().kind, ui::Answerer::FileDialogKind::Save);
+    QCOMPARE(answerer.fileDialogs.back().initialName, QStringLiteral("keep"));
 
     // Without an injected answerer the real modal box asks; a timer presses No.
     host_->SetAnswerer(nullptr);
