@@ -105,6 +105,16 @@ void DialogFixture::Open(const std::string& settings, const std::string& fileArg
     ASSERT_TRUE(dialog_->Create());
 }
 
+void DialogFixture::StartOnCom1(const std::string& brickLines, const std::string& portLines,
+                                const std::string& options)
+{
+    ASSERT_NO_FATAL_FAILURE(
+        Start(std::string(kFastLink) + "[brick b1]\n" + brickLines + "[port COM1]\n" + portLines,
+              "Serial=COM1", options));
+    ASSERT_NE(dialog_->brickHandle(), 0);
+    ClearEvents();
+}
+
 void DialogFixture::Stop(bool settle)
 {
     if (dialog_ && dialog_->handle() != ui::kNoWindow) {

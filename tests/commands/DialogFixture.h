@@ -50,6 +50,9 @@ protected:
         scenario_ = scenario;
         Open("[PORTS]\n" + ports + "\n[OPTIONS]\n" + options + "\n", fileArgument);
     }
+    // Starts with the serial tower COM1 opened, the brick's and port's lines added.
+    void StartOnCom1(const std::string& brickLines = "", const std::string& portLines = "",
+                     const std::string& options = "");
     // Closes the window as File/Exit does; with settle, reports on their way are handled first.
     void Stop(bool settle = true);
     void SetScenario(const std::string& scenario) { scenario_ = scenario; }

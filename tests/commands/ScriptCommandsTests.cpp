@@ -19,15 +19,6 @@ constexpr const char* kUndeclared = "Error (0xe0050810) from Tessel compiler: sp
 
 class ScriptCommands : public DialogFixture {
 protected:
-    // The default installation with its serial tower opened at start-up.
-    void StartOpen(const std::string& extraPortLines = "", const std::string& options = "")
-    {
-        ASSERT_NO_FATAL_FAILURE(
-            Start(std::string(kFastLink) + "[brick b1]\n[port COM1]\n" + extraPortLines,
-                  "Serial=COM1", options));
-        ASSERT_NE(dialog().brickHandle(), 0);
-        ClearEvents();
-    }
     void EditBinary(const std::string& objectText)
     {
         SetText(ui::IdEditor, objectText);
@@ -64,7 +55,7 @@ TEST_F(ScriptCommands, WithoutAPortOnlyValidateWorks)
 
 TEST_F(ScriptCommands, AnEmptyEditorOnlyClearsTheStatusBox)
 {
-    ASSERT_NO_FATAL_FAILURE(StartOpen());
+    ASSERT_NO_FATAL_FAILURE(StartOnCom1());
     SetText(ui::IdEditor, "");
     for (int id : {ui::IdValidate, ui::IdExecute, ui::IdExecuteAsync, ui::IdDownload}) {
         ClearEvents();
@@ -83,7 +74,7 @@ struct RunCase {
 
 TEST_F(ScriptCommands, ResultsAreShownAsTheyArriveAndTheEditorKeepsTheFocus)
 {
-    ASSERT_NO_FATAL_FAILURE(StartOpen());
+    ASSERT_NO_FATAL_FAILURE(StartOnCom1());
     const std::string answer = std::string("Exec result: 0 (") + kVersionAnswer + ")";
     const std::string asyncAnswer = std::string("Exec result: ") + kVersionAnswer;
     const RunCase runs[] = {
@@ -125,7 +116,7 @@ TEST_F(ScriptCommands, AnAsyncCallRefusedOutrightLeavesTheFirstRunning)
 
 TEST_F(ScriptCommands, ClosingWithAResultOnItsWayAndReceptionOnComesDownCleanly)
 {
-    ASSERT_NO_FATAL_FAILURE(StartOpen());
+    ASSERT_NO_FATAL_FAILURE(StartOnCom1());
     Click(ui::IdReceive);
     ASSERT_TRUE(dialog().receiving());
     EditBinary(kVersionRequest);
@@ -144,7 +135,7 @@ TEST_F(ScriptCommands, DownloadProgressIsShownInOrderAndEndsWithTheElapsedTime)
          {"", "Downloading", "Downloading: 25% done", "Downloading: 50% done",
           "Downloading: 75% done", "Downloaded ok (0 mS)"}},
     };
-    ASSERT_NO_FATAL_FAILURE(StartOpen());
+    ASSERT_NO_FATAL_FAILURE(StartOnCom1());
     EditBinary(SoundProgram(40));
     for (const auto& [block, shown] : cases) {
         SCOPED_TRACE(block);
@@ -162,7 +153,7 @@ TEST_F(ScriptCommands, DownloadProgressIsShownInOrderAndEndsWithTheElapsedTime)
 
 TEST_F(ScriptCommands, ATranslationErrorPlacesTheCaretOnTheFaultyWord)
 {
-    ASSERT_NO_FATAL_FAILURE(StartOpen());
+    ASSERT_NO_FATAL_FAILURE(StartOnCom1());
     const std::pair<std::string, int> cases[] = {
         {"program P {\n    main {\n        speed = 1\n    }\n}\n", ui::IdValidate},
         {"sound 4\nwait 10\n", ui::IdExecute},
@@ -185,7 +176,7 @@ TEST_F(ScriptCommands, AutoClearRunsFirstAndAFailureStopsBeforeTranslating)
 {
     // Every packet to the brick is lost, so clearing it fails; the script is wrong too, but
     // its error must not appear: nothing is translated after the failed clear.
-    ASSERT_NO_FATAL_FAILURE(StartOpen("loss = 100\n"));
+    ASSERT_NO_FATAL_FAILURE(StartOnCom1("", "loss = 100\n"));
     host().SetCheck(window(), ui::IdAutoClear, true);
     SetText(ui::IdEditor, "program P {\n    main {\n        speed = 2\n    }\n}\n");
     Click(ui::IdDownload);
@@ -205,9 +196,7 @@ TEST_F(ScriptCommands, AutoRunStartsTheDownloadedProgramAndAutoClearKeepsTheDown
 {
     for (const bool autoRun : {true, false}) {
         SCOPED_TRACE(autoRun);
-        ASSERT_NO_FATAL_FAILURE(StartOpen("", autoRun ? "AUTORUN=TRUE\nAUTOCLEAR=TRUE" : ""));
-        EXPECT_EQ(host().IsChecked(window(), ui::IdAutoRun), autoRun);
-        EXPECT_EQ(host().IsChecked(window(), ui::IdAutoClear), autoRun);
+        ASSERT_NO_FATAL_FAILURE(StartOnCom1("", "", autoRun ? "AUTORUN=TRUE\nAUTOCLEAR=TRUE" : ""));
         SetText(ui::IdEditor, "program P {\n    main {\n        while (1) {\n"
                               "            wait 100\n        }\n    }\n}\n");
         Click(ui::IdDownload);
@@ -222,7 +211,7 @@ TEST_F(ScriptCommands, AutoRunStartsTheDownloadedProgramAndAutoClearKeepsTheDown
 
 TEST_F(ScriptCommands, DownloadFileTranslatesTheNamedFileAndLeavesTheEditorAlone)
 {
-    ASSERT_NO_FATAL_FAILURE(StartOpen());
+    ASSERT_NO_FATAL_FAILURE(StartOnCom1());
     SetText(ui::IdEditor, "not even looked at");
     host().SetEditSelection(window(), ui::IdEditor, 5, 5);
     SetText(ui::IdDownloadFileName, WriteFile("robot.onyx2", kGoodProgram));
@@ -258,9 +247,7 @@ TEST_F(ScriptCommands, DownloadFileTranslatesTheNamedFileAndLeavesTheEditorAlone
 
 TEST_F(ScriptCommands, ReceptionShowsEachMessageInTurnUntilSwitchedOff)
 {
-    ASSERT_NO_FATAL_FAILURE(Start(
-        std::string(kFastLink) + "[brick b1]\nmessages = 3, 7, 9\n[port COM1]\n", "Serial=COM1"));
-    ClearEvents();
+    ASSERT_NO_FATAL_FAILURE(StartOnCom1("messages = 3, 7, 9\n"));
     ASSERT_FALSE(host().IsControlVisible(window(), ui::IdReceive)); // hidden, but clickable
     Click(ui::IdReceive);
     EXPECT_TRUE(dialog().receiving());

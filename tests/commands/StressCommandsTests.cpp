@@ -17,13 +17,6 @@ constexpr const char* kOpenProgram = "program S {\n    main {\n        sound 4\n
 
 class StressCommands : public DialogFixture {
 protected:
-    void StartOpen(const std::string& brickLines = "")
-    {
-        ASSERT_NO_FATAL_FAILURE(Start(
-            std::string(kFastLink) + "[brick b1]\n" + brickLines + "[port COM1]\n", "Serial=COM1"));
-        ASSERT_NE(dialog().brickHandle(), 0);
-        ClearEvents();
-    }
     void Stress(const std::string& editor, const std::string& count)
     {
         SetText(ui::IdEditor, editor);
@@ -52,7 +45,7 @@ std::string SourceFileText(ui::TestClientDialog& dialog)
 
 TEST_F(StressCommands, ThreeIterationsCarryOneMoreSpaceEachAndThenPass)
 {
-    ASSERT_NO_FATAL_FAILURE(StartOpen());
+    ASSERT_NO_FATAL_FAILURE(StartOnCom1());
     // When an iteration is announced, its text has just been translated.
     std::vector<std::string> sent;
     ui::TestClientDialog* target = &dialog();
@@ -75,7 +68,7 @@ TEST_F(StressCommands, ThreeIterationsCarryOneMoreSpaceEachAndThenPass)
 
 TEST_F(StressCommands, TheCountIsReadAgainAtEveryStepAndNonNumbersCountAsZero)
 {
-    ASSERT_NO_FATAL_FAILURE(StartOpen());
+    ASSERT_NO_FATAL_FAILURE(StartOnCom1());
     SetText(ui::IdEditor, kOpenProgram);
     SetText(ui::IdStressCount, "100");
     Click(ui::IdStress); // iteration 1 is on its way
@@ -97,7 +90,7 @@ TEST_F(StressCommands, TheCountIsReadAgainAtEveryStepAndNonNumbersCountAsZero)
 
 TEST_F(StressCommands, AStepThatCannotGoOnEndsOrKeepsTheIteration)
 {
-    ASSERT_NO_FATAL_FAILURE(StartOpen());
+    ASSERT_NO_FATAL_FAILURE(StartOnCom1());
     Stress("this is } not { a script", "3");
     EXPECT_EQ(LastStatus().rfind("Stress Script2SplitByteCode() failed on iteration 1, 0xe005", 0),
               0u)
@@ -111,7 +104,7 @@ TEST_F(StressCommands, AStepThatCannotGoOnEndsOrKeepsTheIteration)
     Stop();
 
     // Program memory too small for any program: the download does not start.
-    ASSERT_NO_FATAL_FAILURE(StartOpen("memory = 0\n"));
+    ASSERT_NO_FATAL_FAILURE(StartOnCom1("memory = 0\n"));
     Stress(kOpenProgram, "3");
     EXPECT_EQ(LastStatus(),
               "Error (0xe005040e) from Tessel driver: not enough memory for task/sub");
@@ -140,7 +133,7 @@ TEST_F(StressCommands, ADownloadThatBreaksOffStallsTheTestUntilTheUserDownloads)
 
 TEST_F(StressCommands, AboutShowsTwoLinesAndChangesNothing)
 {
-    ASSERT_NO_FATAL_FAILURE(StartOpen());
+    ASSERT_NO_FATAL_FAILURE(StartOnCom1());
     SetText(ui::IdEditor, "kept");
     Click(ui::IdAbout);
 

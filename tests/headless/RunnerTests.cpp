@@ -17,22 +17,20 @@ class RunnerTest : public DialogFixture {
 protected:
     // Runs script on a dialog built from settings; keeps the transcript and the messages.
     int Run(const std::string& script, const std::string& settings = "",
-            HeadlessOptions options = {}, const std::string& fileArgument = "",
+            HeadlessOptions options = {},
             const std::string& library = commands_test::SimulatorDirectory())
     {
-        Construct(settings, fileArgument, library);
+        Construct(settings, "", library);
         std::istringstream in(script);
         options.fixedTicks = true;
         HeadlessRunner runner(host(), dialog(), in, out, err, options);
         const int status = runner.Run();
         failed = runner.commandsFailed();
-        run = runner.commandsRun();
         return status;
     }
     std::ostringstream out;
     std::ostringstream err;
     int failed = 0;
-    int run = 0;
 };
 
 } // namespace
@@ -153,7 +151,7 @@ TEST_F(RunnerTest, AnOperationGivenUpOnIsNotWaitedForAgain)
     library.state().results[tessel::SlotCreate] = 3;
     HeadlessOptions options;
     options.waitTimeoutMs = 50;
-    EXPECT_EQ(Run("Editor a\nDownload\nEditor b\nEditor c\n", "[PORTS]\nUSB=T\n", options, "",
+    EXPECT_EQ(Run("Editor a\nDownload\nEditor b\nEditor c\n", "[PORTS]\nUSB=T\n", options,
                   commands_test::RecordingLibraryDirectory()),
               HeadlessFailed);
     const std::string text = out.str();
