@@ -152,6 +152,20 @@ private:
     }
 };
 
+inline std::string ReadFile(const std::string& path)
+{
+    std::stringstream text;
+    text << std::ifstream(path, std::ios::binary).rdbuf();
+    return text.str();
+}
+
+// The log after the banner (up to the first blank line).
+inline std::string LogBody(const std::string& log)
+{
+    const auto end = log.find("\n\n");
+    return end == std::string::npos ? log : log.substr(end + 2);
+}
+
 // A log file path of each test's own, removed before and after.
 class TempLog {
 public:
@@ -166,19 +180,8 @@ public:
 
     const char* path() const { return path_.c_str(); }
     bool exists() const { return std::ifstream(path_).good(); }
-    std::string contents() const
-    {
-        std::stringstream text;
-        text << std::ifstream(path_, std::ios::binary).rdbuf();
-        return text.str();
-    }
-    // The log after the banner (up to the first blank line).
-    std::string body() const
-    {
-        const std::string all = contents();
-        const auto end = all.find("\n\n");
-        return end == std::string::npos ? all : all.substr(end + 2);
-    }
+    std::string contents() const { return ReadFile(path_); }
+    std::string body() const { return LogBody(contents()); }
 
 private:
     std::string path_;
@@ -210,6 +213,7 @@ class RecordingViewer final : public HelpViewer {
 public:
     int openAnswer = 1;
     Strings calls;
+    Strings macros; // the macros alone
     ui::WindowHandle lastOwner = ui::kNoWindow;
 
     int OpenFile(ui::WindowHandle owner, const char* file) override
@@ -218,21 +222,12 @@ public:
     }
     int RunMacro(ui::WindowHandle owner, const char*, const char* macro) override
     {
+        macros.push_back(macro);
         return Record(owner, std::string("macro ") + macro, 1);
     }
     int Quit(ui::WindowHandle owner, const char* file) override
     {
         return Record(owner, std::string("quit ") + file, 1);
-    }
-    Strings Macros() const
-    {
-        Strings macros;
-        for (const std::string& call : calls) {
-            if (call.rfind("macro ", 0) == 0) {
-                macros.push_back(call.substr(6));
-            }
-        }
-        return macros;
     }
 
 private:

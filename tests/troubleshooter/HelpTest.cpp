@@ -300,7 +300,7 @@ TEST_F(HelpProtocol, EachTestOpensItsSuccessTopic)
         EXPECT_EQ(link.HandleHelpCommand(id, argument), 0) << id;
     }
     EXPECT_EQ(
-        viewer.Macros(),
+        viewer.macros,
         (Strings{Jump("Found_working_IR_Transmitter"), Jump("IR_Transmitter_ok"), Jump("Onyx_ok"),
                  Jump("IR_Transmitter_range_set_ok"), Jump("Found_working_COM_port"),
                  Jump("Found_working_IR_Transmitter"), Jump("Found_working_IR_Transmitter")}));
@@ -311,19 +311,6 @@ TEST_F(HelpProtocol, EachTestOpensItsSuccessTopic)
     // The port number is the low sixteen bits of the argument.
     EXPECT_NE(body.find("\nTest serial tower:\n\tTest COM port COM3: ok\n\tCreate port COM3 ok\n"),
               std::string::npos);
-}
-
-TEST_F(HelpProtocol, PortTypeCommandDecidesTheNextNoMoreItemsJump)
-{
-    HelpLink link(&shooter, host, &viewer);
-    script = {{3001, 3}, {2007, 0}, {2000, 0}}; // no COM port: 2007 ends with library code 82
-    EXPECT_TRUE(shooter.Diagnose(Packed(0xE0050421u), &link));
-    EXPECT_EQ(viewer.Macros(), (Strings{Jump("IR_Transmitter_or_cable_not_connected"),
-                                        Jump("USB_Transmitter_not_installed")}));
-    EXPECT_EQ(shooter.portType(), 3);
-    EXPECT_FALSE(link.HelpOpen());
-    EXPECT_EQ(viewer.calls.back(), "quit shooter.hlp");
-    EXPECT_FALSE(host.QuitRequested());
 }
 
 TEST_F(HelpProtocol, FailedTestJumpsToItsOwnOutcomeAndCloseEndsThePump)
@@ -348,7 +335,7 @@ TEST_F(HelpProtocol, RepairedUsbTowerLetsTheArgumentStand)
     calls.findPortAnswers = {{0, "KIVOTOWER"}, {0, "KIVOTOWER"}};
     script = {{2001, 0}, {2008, Packed(0xE0050413u)}, {2000, 0}};
     shooter.Diagnose(Packed(0xE0050401u), &link);
-    EXPECT_EQ(viewer.Macros(),
+    EXPECT_EQ(viewer.macros,
               (Strings{Jump("IR_Transmitter_not_found"), Jump("Found_working_IR_Transmitter"),
                        Jump("Failed_to_set_IR_Transmitter_to_long_range")}));
     EXPECT_EQ(log.body().find("Find Tower:"), std::string::npos);
@@ -380,17 +367,6 @@ TEST_F(HelpProtocol, QuitRequestEndsTheRunAndStaysPending)
     EXPECT_FALSE(link.HelpOpen());
     EXPECT_TRUE(host.QuitRequested());
     EXPECT_EQ(viewer.calls.back(), "quit shooter.hlp");
-}
-
-TEST_F(HelpProtocol, MissingHelpFileEndsTheRunAtOnceWithTheDiagnosisLogged)
-{
-    viewer.openAnswer = 0;
-    HelpLink link(&shooter, host, &viewer);
-    EXPECT_TRUE(shooter.Diagnose(Packed(0xE0050421u), &link));
-    EXPECT_EQ(idleCalls, 0);
-    shooter.CloseLog();
-    EXPECT_NE(log.body().find("\tDiagnosing Error failed:\n"), std::string::npos);
-    EXPECT_NE(log.body().find("\nTrouble Shooter closed\n"), std::string::npos);
 }
 
 } // namespace

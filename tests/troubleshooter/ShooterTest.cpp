@@ -150,8 +150,7 @@ TEST_F(TroubleShooterLog, OperatingSystemLine)
          "Windows 98 version 4.10  A  (Build 2222)\n"},
         {false, 1, 4, 0, 0x040003B6, "", 0, nullptr, "Windows 95 version 4.0  (Build 950)\n"},
         {false, 0, 1, 0, 0, "", 0, nullptr, "Win32s\n"},
-        {false, 7, 1, 0, 0, "", 0, nullptr, "Unknown OS\n"},
-    };
+        {false, 7, 1, 0, 0, "", 0, nullptr, "Unknown OS\n"}};
     for (const Case& c : cases) {
         SCOPED_TRACE(c.line);
         platform::ScriptedSystemInfo scripted;

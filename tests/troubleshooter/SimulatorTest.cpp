@@ -65,11 +65,7 @@ protected:
         ASSERT_TRUE(session_->libraryLoaded()) << "Tessel.dll not found in " HARBOR_SIM_DIR;
     }
     std::string LogPath() const { return (dir_ / "shooter.log").string(); }
-    std::string Log() const
-    {
-        std::ifstream in(LogPath(), std::ios::binary);
-        return std::string(std::istreambuf_iterator<char>(in), std::istreambuf_iterator<char>());
-    }
+    std::string Log() const { return ReadFile(LogPath()); }
     std::string WriteFile(const std::string& name, const std::string& bytes)
     {
         const std::string path = (dir_ / name).string();
@@ -94,11 +90,7 @@ protected:
         shooter =
             std::make_unique<TroubleShooter>(calls.get(), &handle, LogPath().c_str(), &system);
     }
-    std::string Body() const
-    {
-        const std::string log = Log();
-        return log.substr(log.find("\n\n") + 2);
-    }
+    std::string Body() const { return LogBody(Log()); }
 
     platform::ScriptedSystemInfo system;
     tessel::Long handle = 0;
@@ -166,8 +158,7 @@ TEST_F(SimulatedDiagnosis, OutcomeEdgeCases)
         {"COM1",
          0xE0030010u,
          {},
-         "\tJump facility failed:\n\t\tError (0xe0030010) from Opal: undefined label\n"},
-    };
+         "\tJump facility failed:\n\t\tError (0xe0030010) from Opal: undefined label\n"}};
     Start("[brick onyx2]\n[port KIVOTOWER1]\n[port COM1]\n");
     for (const Case& c : cases) {
         SCOPED_TRACE(std::string(c.port) + " " + std::to_string(c.error));
@@ -218,7 +209,14 @@ protected:
             }
         });
         viewer_ = std::make_unique<HeadlessHelpViewer>(
-            *host_, [this](const std::string& line) { printed.push_back(line); }, helpDirectory);
+            *host_,
+            [this](const std::string& line) {
+                printed.push_back(line);
+                if (line.rfind("[help] topic ", 0) == 0) {
+                    topics.push_back(line.substr(13));
+                }
+            },
+            helpDirectory);
         // The help's links, in order; when they run out the viewer is closed, as at the end
         // of a headless run.
         host_->SetIdleHandler([this] {
@@ -247,16 +245,6 @@ protected:
         ASSERT_TRUE(dialog_->Create());
     }
 
-    Strings Topics() const
-    {
-        Strings topics;
-        for (const std::string& line : printed) {
-            if (line.rfind("[help] topic ", 0) == 0) {
-                topics.push_back(line.substr(13));
-            }
-        }
-        return topics;
-    }
     void ExpectRunEndedCleanly()
     {
         EXPECT_FALSE(host_->QuitRequested()) << "the help never closed";
@@ -274,6 +262,7 @@ protected:
     std::unique_ptr<ui::TestClientDialog> dialog_;
     std::deque<std::pair<int, std::int32_t>> links;
     Strings printed;
+    Strings topics; // the topic ids among the printed lines
     Strings questions;
     bool nestedResult = false;
 };
@@ -303,7 +292,7 @@ TEST_P(TroubleShooterRuns, ShowTheTopicsOfTheLinksFollowedAndEndCleanly)
     EXPECT_TRUE(run.error < 100
                     ? dialog().OfferTroubleShooterForStatus(static_cast<int>(run.error), "dead")
                     : dialog().OfferTroubleShooter(Packed(run.error)));
-    EXPECT_EQ(Topics(), run.topics);
+    EXPECT_EQ(topics, run.topics);
     EXPECT_NE(Log().find(run.logged), std::string::npos) << Log();
     EXPECT_EQ(printed.back(), "[help] closed");
     for (const auto& link : run.links) {
@@ -386,7 +375,7 @@ TEST_F(TroubleShooterOffers, MissingHelpFileEndsTheRunWithTheDiagnosisLogged)
     StartDialog(kSerialBench, "Serial=COM1", "/nonexistent/");
     host_->QueueAnswer(true);
     EXPECT_TRUE(dialog().OfferTroubleShooter(Packed(0xE0050421u)));
-    EXPECT_TRUE(Topics().empty());
+    EXPECT_TRUE(topics.empty());
     EXPECT_EQ(printed.front(), "[help] cannot open /nonexistent/shooter.hlp");
     ExpectRunEndedCleanly();
     EXPECT_NE(Log().find("\tDiagnosing Error failed:\n"), std::string::npos);
