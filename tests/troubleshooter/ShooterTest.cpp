@@ -34,19 +34,6 @@ TEST_F(TroubleShooterLog, EachRunEmptiesTheFileWritesTheBannerAndClosesWithTheTi
     EXPECT_TRUE(calls.calls.empty());
 }
 
-TEST_F(TroubleShooterLog, StepsLogOkOrTheCatalogueTextAndKeepTheirValue)
-{
-    TroubleShooter shooter(&calls, &handle, log.path(), &system);
-    EXPECT_EQ(shooter.LogStep("Find port", 0), 0);
-    EXPECT_EQ(shooter.LogStep("Find port", Packed(0xE0050444u)), Packed(0xE0050444u));
-    EXPECT_EQ(shooter.LogStep("Positive", 0x20020000), 0x20020000);
-    EXPECT_EQ(
-        log.body(),
-        "\tFind port ok\n"
-        "\tFind port failed:\n\t\tError (0xe0050444) from Tessel driver: no more ports found\n"
-        "\tPositive ok\n");
-}
-
 TEST_F(TroubleShooterLog, EmptyMissingOrUnopenableNameWritesNothing)
 {
     const std::string unopenable = std::string(log.path()) + ".missing-dir/x.log";
@@ -79,16 +66,22 @@ TEST_F(TroubleShooterLog, SectionWithoutSessionOrHandleSlotFailsBeforeAnyCall)
     }
 }
 
-TEST_F(TroubleShooterLog, CreatePortStoresTheHandleOrKeepsTheOldOne)
+TEST_F(TroubleShooterLog, StepsLogOkOrTheCatalogueTextAndCreatePortKeepsTheOldHandleOnFailure)
 {
     TroubleShooter shooter(&calls, &handle, log.path(), &system);
+    EXPECT_EQ(shooter.LogStep("Find port", 0), 0);
+    EXPECT_EQ(shooter.LogStep("Find port", Packed(0xE0050444u)), Packed(0xE0050444u));
+    EXPECT_EQ(shooter.LogStep("Positive", 0x20020000), 0x20020000);
     calls.createHandle = 0;
     EXPECT_EQ(shooter.CreatePort("COM9"), Packed(0xE0050401u));
     EXPECT_EQ(handle, 5);
     calls.createHandle = 42;
     EXPECT_EQ(shooter.CreatePort("\\\\.\\COM2"), 0);
     EXPECT_EQ(handle, 42);
-    EXPECT_EQ(log.body(), "\tCreate port COM9 failed:\n"
+    EXPECT_EQ(log.body(), "\tFind port ok\n"
+                          "\tFind port failed:\n\t\tError (0xe0050444) from Tessel driver: no more "
+                          "ports found\n\tPositive ok\n"
+                          "\tCreate port COM9 failed:\n"
                           "\t\tError (0xe0050401) from Tessel driver: invalid hBrick\n"
                           "\tCreate port \\\\.\\COM2 ok\n");
     EXPECT_EQ(calls.calls, (Strings{"Create(COM9)", "Create(\\\\.\\COM2)"}));
@@ -453,7 +446,7 @@ TEST_F(Diagnosis, JumpLogsUnlistedValuesUnderTheirLabel)
     EXPECT_EQ(view.shown, std::vector<int>{1002});
 }
 
-TEST(OutcomeTables, EveryListedCodeGivesItsOutcome)
+TEST(OutcomeTables, EveryListedCodeGivesItsOutcomeAndOthersTheirLabel)
 {
     const std::pair<std::uint32_t, int> listed[] = {
         {0xE0050401u, 1001}, {0xE0050402u, 1004}, {0xE0050403u, 1007}, {0xE005040Bu, 1003},
@@ -475,10 +468,7 @@ TEST(OutcomeTables, EveryListedCodeGivesItsOutcome)
     EXPECT_EQ(TroubleShooter::OutcomeOf(Packed(0xE0050C52u), 3, nullptr), 1102);
     EXPECT_EQ(TroubleShooter::OutcomeOf(Packed(0xE0050C52u), 1, nullptr), 1002);
     EXPECT_EQ(TroubleShooter::OutcomeOf(Packed(0xE0050C52u), 0, nullptr), 1002);
-}
-
-TEST(OutcomeTables, UnlistedValuesGiveNoOutcomeAndTheirLabel)
-{
+    // Unlisted values give no outcome but the label they are logged under.
     const std::pair<std::uint32_t, const char*> unlisted[] = {
         {0xE0050454u, "Jump Brick"},         {0xE0050444u, "Jump Brick"},
         {0xE0050801u, "Jump Script"},        {0xE0050C49u, "Jump Tessel"},

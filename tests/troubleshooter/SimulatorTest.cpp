@@ -361,15 +361,6 @@ TEST_F(TroubleShooterOffers, NoToEitherQuestionLeavesTheLogUntouched)
     EXPECT_TRUE(printed.empty());
 }
 
-TEST_F(TroubleShooterOffers, TheDialogGoesOnWithThePortATestOpened)
-{
-    StartDialog(kSerialBench, "Serial=COM1");
-    links = {{2004, 3}, {2000, 0}};
-    host_->QueueAnswer(true);
-    EXPECT_TRUE(dialog().OfferTroubleShooter(Packed(0xE0050421u)));
-    EXPECT_NE(dialog().brickHandle(), 0);
-}
-
 TEST_F(TroubleShooterOffers, MissingHelpFileEndsTheRunWithTheDiagnosisLogged)
 {
     StartDialog(kSerialBench, "Serial=COM1", "/nonexistent/");
@@ -397,13 +388,19 @@ TEST_F(TroubleShooterOffers, QuietRepairFindsTheUsbTowerAndAsksNothing)
     EXPECT_FALSE(std::filesystem::exists(LogPath()));
 }
 
-TEST_F(TroubleShooterOffers, QuietRepairOfASerialTowerDoesNothing)
+TEST_F(TroubleShooterOffers,
+       SerialTowerIsNotRepairedQuietlyAndTheDialogGoesOnWithThePortATestOpened)
 {
     StartDialog(kSerialBench, "Serial=COM1");
     const tessel::Long handle = dialog().brickHandle();
     EXPECT_FALSE(dialog().QuietRepair(4));
     EXPECT_EQ(dialog().brickHandle(), handle);
     EXPECT_FALSE(std::filesystem::exists(LogPath()));
+    links = {{2004, 3}, {2000, 0}};
+    host_->QueueAnswer(true);
+    EXPECT_TRUE(dialog().OfferTroubleShooter(Packed(0xE0050421u)));
+    EXPECT_EQ(dialog().session()->Status(dialog().brickHandle(), tessel::StatusPort, nullptr, 0),
+              1);
 }
 
 } // namespace
