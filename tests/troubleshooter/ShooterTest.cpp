@@ -277,7 +277,7 @@ TEST_F(Diagnosis, FindTowerReopensTheFoundPortWithTheBrickTypeKeptOrAssumed)
               0);
 }
 
-TEST_F(Diagnosis, ReopenEndsAtAFailedCreateOrBrickType)
+TEST_F(Diagnosis, LocateEndsAtAFailedCreateBrickTypeOrTowerName)
 {
     calls.findPortAnswers = {{0, "COM1"}};
     calls.createHandle = 0;
@@ -290,10 +290,7 @@ TEST_F(Diagnosis, ReopenEndsAtAFailedCreateOrBrickType)
               std::string("\tFind port ok\n\tCreate port COM1 ok\n\tSet brick type failed:\n") +
                   kNotAlive,
               8);
-}
-
-TEST_F(Diagnosis, LocateUsbTowerWantsTheTowerNameInCapitals)
-{
+    // The USB tower is known by its name in capitals.
     for (const char* name : {"COM1", "kivotower"}) {
         calls.findPortAnswers = {{0, name}};
         ExpectRun(Shooter().LocateUsbTower(), 0xE0050444u, "\tFind port ok\n", 0);
@@ -314,7 +311,7 @@ TEST_F(Diagnosis, FindUsbTowerTakesTheFirstUsbPort)
               std::string("\nFind USB Tower:\n\tEnum USB ports failed:\n") + kNoMoreItems, 0);
 }
 
-TEST_F(Diagnosis, FindComPortSkipsPortsThatCannotBeUsed)
+TEST_F(Diagnosis, FindComPortSkipsPortsThatCannotBeUsedAndCutsAnEndlessList)
 {
     calls.enumAnswers[3] = {{Packed(0xE0050450u), 1, "COM1"}, {0, 2, "COM2"}};
     ExpectRun(
@@ -324,6 +321,12 @@ TEST_F(Diagnosis, FindComPortSkipsPortsThatCannotBeUsed)
     calls.enumAnswers[3] = {{Packed(0xE0050450u), 1, "COM1"}};
     ExpectRun(Shooter().FindComPort(), 0xE0050C52u,
               std::string("\nFind COM port:\n\tEnum COM ports failed:\n") + kNoMoreItems, 0);
+    // An enumeration that never ends is cut off.
+    for (int i = 0; i < 1000; ++i) {
+        calls.enumAnswers[3].push_back({Packed(0xE0050450u), static_cast<tessel::Short>(i), "COM"});
+    }
+    EXPECT_EQ(Shooter().FindComPort(), Packed(0xE0050C52u));
+    EXPECT_EQ(calls.calls.size(), 2u + TroubleShooter::kMaxEnumeratedItems);
 }
 
 TEST_F(Diagnosis, TestSerialPortOpensTheNumberedPortOrNamesTheLastListed)
@@ -392,15 +395,6 @@ TEST_F(Diagnosis, SetUsbRange)
               "\nSet USB Range:\n\tSet range failed:\n\t\tError (0xe0050413) from Tessel driver: "
               "failed to set USB port to long range\n",
               5, {"Set(5,8,2)"});
-}
-
-TEST_F(Diagnosis, EnumerationThatNeverEndsIsCutOff)
-{
-    for (int i = 0; i < 1000; ++i) {
-        calls.enumAnswers[3].push_back({Packed(0xE0050450u), static_cast<tessel::Short>(i), "COM"});
-    }
-    EXPECT_EQ(Shooter().FindComPort(), Packed(0xE0050C52u));
-    EXPECT_EQ(calls.calls.size(), 2u + TroubleShooter::kMaxEnumeratedItems);
 }
 
 TEST_F(Diagnosis, SerialTowerIsNotSearchedForAgain)
