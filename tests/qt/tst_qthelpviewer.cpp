@@ -10,8 +10,6 @@
 #include <QTimer>
 #include <QUrl>
 
-#include <memory>
-
 #include "Support.h"
 #include "session/BrickSession.h"
 #include "ui/TestClientDialog.h"

@@ -36,11 +36,10 @@ class tst_TestClientDialog : public QObject {
 
 private slots:
     void cleanup();
-    void startedWindow();
+    void startedWindowAndFileOpen();
     void clickChangesStatus_data();
     void clickChangesStatus();
     void longDownloadKeepsTheWindowResponsive();
-    void fileOpenThroughTheAnswerer();
 
 private:
     void start(const std::string& scenario, const std::string& ports,
@@ -98,7 +97,7 @@ void tst_TestClientDialog::click(int id)
     button->click();
 }
 
-void tst_TestClientDialog::startedWindow()
+void tst_TestClientDialog::startedWindowAndFileOpen()
 {
     // The dialog's start as the widgets show it; with no port configured, no status text.
     start(qt_test::kFastLink, "", "AUTOCLEAR=TRUE");
@@ -113,6 +112,18 @@ void tst_TestClientDialog::startedWindow()
     QVERIFY(!control<QWidget>(ui::IdRangeShort)->isEnabled());
     // The host hands its help viewer to the dialog it shows.
     QCOMPARE(static_cast<HelpViewer*>(&host_->helpViewer()), dialog_->helpViewer());
+
+    // File Open asks the answerer with the dialog's filters, in Qt's form.
+    answerer_.QueueFile(folder_->writeFile(QStringLiteral("tune.onyx2"), "task main\r\n"));
+    window()->menuAction(ui::IdFileOpen)->trigger();
+    QCOMPARE(answerer_.fileDialogs.size(), std::size_t(1));
+    const auto& open = answerer_.fileDialogs[0];
+    QCOMPARE(open.kind, ui::Answerer::FileDialogKind::Open);
+    QCOMPARE(open.initialName, QStringLiteral("*.onyx2"));
+    QCOMPARE(open.owner, static_cast<QWidget*>(window()));
+    QCOMPARE(open.filters,
+             QStringList({"Onyx2 Files (*.onyx2)", "Text files (*.txt)", "All files (*)"}));
+    QCOMPARE(window()->windowTitle(), QStringLiteral("Tessel Test Client - tune.onyx2"));
 }
 
 void tst_TestClientDialog::clickChangesStatus_data()
@@ -188,23 +199,6 @@ void tst_TestClientDialog::longDownloadKeepsTheWindowResponsive()
     // timers fired, and so would paint and input events.
     QVERIFY2(seen.first().startsWith(QLatin1String("Downloading: ")), qPrintable(seen.join('|')));
     QVERIFY(ticks > ticksAtClick);
-}
-
-void tst_TestClientDialog::fileOpenThroughTheAnswerer()
-{
-    start(qt_test::kFastLink, "");
-    const QString source = folder_->writeFile(QStringLiteral("tune.onyx2"), "task main\r\n");
-
-    answerer_.QueueFile(source);
-    window()->menuAction(ui::IdFileOpen)->trigger();
-    QCOMPARE(answerer_.fileDialogs.size(), std::size_t(1));
-    const auto& open = answerer_.fileDialogs[0];
-    QCOMPARE(open.kind, ui::Answerer::FileDialogKind::Open);
-    QCOMPARE(open.initialName, QStringLiteral("*.onyx2"));
-    QCOMPARE(open.owner, static_cast<QWidget*>(window()));
-    QCOMPARE(open.filters,
-             QStringList({"Onyx2 Files (*.onyx2)", "Text files (*.txt)", "All files (*)"}));
-    QCOMPARE(window()->windowTitle(), QStringLiteral("Tessel Test Client - tune.onyx2"));
 }
 
 QTEST_MAIN(tst_TestClientDialog)
