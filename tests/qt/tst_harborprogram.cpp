@@ -1,5 +1,6 @@
-// RegServer and UnregServer: the desktop entry and the "*.onyx2" MIME type installed into a
-// temporary data folder by the program itself and removed again.
+// The harbor program seen from outside: it shows its window and ends cleanly, or without a
+// reachable display says so in one line; its RegServer and UnregServer switches install the
+// desktop entry and the "*.onyx2" MIME type into a data folder and remove them again.
 #include <QDir>
 #include <QFile>
 #include <QFileInfo>
@@ -38,12 +39,31 @@ void SetEnv(const char* name, const QByteArray& value)
         qputenv(name, value);
 }
 
+struct Outcome {
+    bool normalExit; // no crash, no abort, no hang
+    int code;
+    QByteArray out;
+    QByteArray errors;
+};
+
+Outcome RunHarbor(const QProcessEnvironment& environment, const QStringList& arguments)
+{
+    QProcess harbor;
+    harbor.setProcessEnvironment(environment);
+    harbor.start(QStringLiteral(HARBOR_PROGRAM), arguments);
+    const bool finished = harbor.waitForFinished(60000);
+    return {finished && harbor.exitStatus() == QProcess::NormalExit, harbor.exitCode(),
+            harbor.readAllStandardOutput(), harbor.readAllStandardError()};
+}
+
 } // namespace
 
-class tst_DesktopRegistration : public QObject {
+class tst_HarborProgram : public QObject {
     Q_OBJECT
 
 private slots:
+    void start_data();
+    void start();
     void registerThenUnregister();
     void execLine();
     void registerFailsWhereNothingCanBeWritten();
@@ -51,20 +71,64 @@ private slots:
     void userDataHome();
 };
 
-void tst_DesktopRegistration::registerThenUnregister()
+void tst_HarborProgram::start_data()
+{
+    QTest::addColumn<QString>("platform");
+    QTest::addColumn<QString>("display");
+    QTest::addColumn<QString>("says");
+
+    // Settings, session, the window shown, then its own Exit through the message loop (the
+    // start-up benchmark's hook) and the teardown.
+    QTest::newRow("shown then exit") << "offscreen"
+                                     << ""
+                                     << "";
+    // Nothing names a display: the program does not even try.
+    QTest::newRow("no display set") << ""
+                                    << ""
+                                    << "no display";
+    // A display is named but cannot be reached: the window system refuses.
+    QTest::newRow("display unreachable") << "xcb"
+                                         << ":4711"
+                                         << "cannot be reached";
+}
+
+void tst_HarborProgram::start()
+{
+    QFETCH(QString, platform);
+    QFETCH(QString, display);
+    QFETCH(QString, says);
+
+    QProcessEnvironment environment = QProcessEnvironment::systemEnvironment();
+    for (const char* name : {"DISPLAY", "WAYLAND_DISPLAY", "QT_QPA_PLATFORM"})
+        environment.remove(QString::fromLatin1(name));
+    if (!platform.isEmpty())
+        environment.insert(QStringLiteral("QT_QPA_PLATFORM"), platform);
+    if (!display.isEmpty())
+        environment.insert(QStringLiteral("DISPLAY"), display);
+    environment.insert(QStringLiteral("HARBOR_EXIT_WHEN_SHOWN"), QStringLiteral("1"));
+
+    const Outcome run = RunHarbor(environment, {});
+    QVERIFY(run.normalExit);
+    QCOMPARE(run.code, says.isEmpty() ? 0 : 1);
+    QCOMPARE(run.out, says.isEmpty() ? QByteArray("shown\n") : QByteArray());
+    if (!says.isEmpty()) {
+        QVERIFY2(run.errors.count('\n') == 1 && run.errors.contains(says.toUtf8()) &&
+                     run.errors.contains("harbor --headless"),
+                 run.errors.constData());
+    }
+}
+
+void tst_HarborProgram::registerThenUnregister()
 {
     QTemporaryDir data;
     QProcessEnvironment environment = QProcessEnvironment::systemEnvironment();
     environment.insert(QStringLiteral("XDG_DATA_HOME"), data.path());
     // The switch's one line of output, or "failed".
     const auto run = [&](const QString& argument) {
-        QProcess process;
-        process.setProcessEnvironment(environment);
-        process.start(QStringLiteral(HARBOR_PROGRAM), {argument});
-        const bool done = process.waitForFinished(60000) &&
-                          process.exitStatus() == QProcess::NormalExit && process.exitCode() == 0;
-        const QByteArray output = process.readAllStandardOutput() + process.readAllStandardError();
-        return done && output.count('\n') == 1 ? output : "failed: " + output;
+        const Outcome run = RunHarbor(environment, {argument});
+        const QByteArray output = run.out + run.errors;
+        return run.normalExit && run.code == 0 && output.count('\n') == 1 ? output
+                                                                          : "failed: " + output;
     };
     const QString entryPath = data.filePath("applications/harbor.desktop");
     const QString packagePath = data.filePath("mime/packages/harbor-onyx2.xml");
@@ -109,7 +173,7 @@ void tst_DesktopRegistration::registerThenUnregister()
 
 // The program's path as the Exec key needs it: quoted where it holds a blank or a character
 // that quoting must escape (doubled once more for the key's own escapes), '%' doubled.
-void tst_DesktopRegistration::execLine()
+void tst_HarborProgram::execLine()
 {
     const std::pair<const char*, const char*> cases[] = {
         {"/usr/lib/harbor/harbor", "Exec=/usr/lib/harbor/harbor %f"},
@@ -124,7 +188,7 @@ void tst_DesktopRegistration::execLine()
     }
 }
 
-void tst_DesktopRegistration::registerFailsWhereNothingCanBeWritten()
+void tst_HarborProgram::registerFailsWhereNothingCanBeWritten()
 {
     QTemporaryDir data;
     // A file stands where the applications folder should go.
@@ -141,7 +205,7 @@ void tst_DesktopRegistration::registerFailsWhereNothingCanBeWritten()
     QCOMPARE(nowhere.Unregister(report), 1);
 }
 
-void tst_DesktopRegistration::userDataHome_data()
+void tst_HarborProgram::userDataHome_data()
 {
     QTest::addColumn<QByteArray>("xdg");
     QTest::addColumn<QByteArray>("home");
@@ -153,7 +217,7 @@ void tst_DesktopRegistration::userDataHome_data()
     QTest::newRow("neither") << QByteArray() << QByteArray() << "";
 }
 
-void tst_DesktopRegistration::userDataHome()
+void tst_HarborProgram::userDataHome()
 {
     QFETCH(QByteArray, xdg);
     QFETCH(QByteArray, home);
@@ -168,5 +232,5 @@ void tst_DesktopRegistration::userDataHome()
     QCOMPARE(found, expected);
 }
 
-QTEST_MAIN(tst_DesktopRegistration)
-#include "tst_desktopregistration.moc"
+QTEST_MAIN(tst_HarborProgram)
+#include "tst_harborprogram.moc"
