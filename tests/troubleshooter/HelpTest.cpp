@@ -252,6 +252,27 @@ TEST_F(HelpProtocol, OnlyAnAnswerOfExactlyOneOpensTheHelp)
     EXPECT_FALSE(without.HelpOpen());
 }
 
+// A window system that makes no windows: the help's commands, its close included, would have
+// nowhere to go, so the help must not be opened and nothing may wait for it.
+class WindowlessHost final : public ui::HeadlessHost {
+public:
+    ui::WindowHandle CreatePlainWindow(const char*, ui::WindowObject*) override
+    {
+        return ui::kNoWindow;
+    }
+};
+
+TEST_F(HelpProtocol, WithoutItsWindowTheHelpIsNeverOpened)
+{
+    WindowlessHost windowless;
+    HelpLink link(&shooter, windowless, &viewer);
+    EXPECT_EQ(link.window(), ui::kNoWindow);
+    EXPECT_TRUE(link.ShowOutcome(1001)) << "the topic is still known";
+    EXPECT_FALSE(link.HelpOpen()) << "a run would not wait for it";
+    EXPECT_EQ(viewer.calls, Strings{"macro " + Jump("IR_Transmitter_not_found")})
+        << "the file is never opened";
+}
+
 TEST_F(HelpProtocol, TopicTableCoversEveryOutcomeGroup)
 {
     const std::pair<int, const char*> expected[] = {

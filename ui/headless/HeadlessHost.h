@@ -33,7 +33,8 @@ struct HeadlessEvent {
     bool answer = false; // Question: yes; OpenFile/SaveFile: a file was chosen
 };
 
-class HeadlessHost final : public WindowHost {
+// Not final: a test may derive a host whose window system refuses to make windows.
+class HeadlessHost : public WindowHost {
 public:
     HeadlessHost();
     ~HeadlessHost() override;
