@@ -3,6 +3,8 @@
 #pragma once
 
 #include <deque>
+#include <mutex>
+#include <set>
 
 #include "ui/Window.h"
 
@@ -31,6 +33,32 @@ inline std::deque<PostedMessage> TakeMessagesFor(std::deque<PostedMessage>& queu
         }
     }
     return taken;
+}
+
+// What a host does with its queue when a window goes: posting threads stop seeing the window
+// before its object lets go of what it owns (so nothing new is queued for it meanwhile), the
+// object hears it is destroyed, and the messages still queued for it come back undelivered.
+// mutex guards live and queue; it is not held while the object runs.
+inline void RetireWindow(std::mutex& mutex, std::set<WindowHandle>& live,
+                         std::deque<PostedMessage>& queue, WindowHandle window,
+                         WindowObject& object)
+{
+    {
+        std::lock_guard<std::mutex> lock(mutex);
+        live.erase(window);
+    }
+    LResult ignored = 0;
+    object.OnMessage(kMsgDestroy, 0, 0, ignored);
+
+    std::deque<PostedMessage> dropped;
+    {
+        std::lock_guard<std::mutex> lock(mutex);
+        dropped = TakeMessagesFor(queue, window);
+    }
+    for (const PostedMessage& posted : dropped) {
+        object.OnUndelivered(posted.message, posted.wParam, posted.lParam);
+    }
+    object.DetachWindow();
 }
 
 } // namespace ui

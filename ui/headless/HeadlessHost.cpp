@@ -140,25 +140,7 @@ void HeadlessHost::DestroyWindow(WindowHandle window)
     Window* w = find(window);
     if (w == nullptr)
         return;
-    WindowObject* object = w->object;
-    // Posting threads must stop seeing the window before the object lets go of what it
-    // owns, so nothing new is queued for it while it is torn down.
-    {
-        std::lock_guard<std::mutex> lock(mutex_);
-        live_.erase(window);
-    }
-    LResult ignored = 0;
-    object->OnMessage(kMsgDestroy, 0, 0, ignored);
-
-    std::deque<Posted> dropped;
-    {
-        std::lock_guard<std::mutex> lock(mutex_);
-        dropped = TakeMessagesFor(queue_, window);
-    }
-    for (const Posted& posted : dropped) {
-        object->OnUndelivered(posted.message, posted.wParam, posted.lParam);
-    }
-    object->DetachWindow();
+    RetireWindow(mutex_, live_, queue_, window, *w->object);
     windows_.erase(window);
 }
 
