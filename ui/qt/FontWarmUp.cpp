@@ -16,11 +16,6 @@ FontWarmUp::FontWarmUp()
 
 FontWarmUp::~FontWarmUp()
 {
-    Wait();
-}
-
-void FontWarmUp::Wait()
-{
     if (thread_.joinable())
         thread_.join();
 }

@@ -3,8 +3,9 @@
 //
 // The first text any window measures waits for fontconfig to parse its configuration and
 // map its caches; nothing else at start-up needs that, so it can run beside the platform's
-// and the session's set-up. Wait() before the first window measures text: fontconfig is
-// safe to call from two threads, but both would then load the configuration.
+// and the session's set-up. Destroying it waits for the thread; do so before the first
+// window measures text: fontconfig is safe to call from two threads, but both would then load
+// the configuration.
 #pragma once
 
 #include <thread>
@@ -18,8 +19,6 @@ public:
 
     FontWarmUp(const FontWarmUp&) = delete;
     FontWarmUp& operator=(const FontWarmUp&) = delete;
-
-    void Wait();
 
 private:
     std::thread thread_;

@@ -184,8 +184,7 @@ WindowHandle QtHost::CreateDialogWindow(const DialogTemplate& layout, WindowObje
     const WindowHandle handle = nextHandle_++;
     Window& window = windows_[handle];
     window.object = object;
-    if (fontWarmUp_)
-        fontWarmUp_->Wait();
+    fontWarmUp_.reset(); // waits for the font configuration before any text is measured
     window.dialog = new DialogWindow(layout);
     QObject::connect(window.dialog.data(), &DialogWindow::commandIssued, receiver_.get(),
                      [this, handle](int id) { onDialogCommand(handle, id); });

@@ -50,7 +50,7 @@ public:
     // The host owns the application from now on and destroys it last, after every window.
     void AdoptApplication(std::unique_ptr<QApplication> application);
     // The font configuration still loading beside the start-up; the first dialog window
-    // waits for it before it measures its text.
+    // lets it finish before it measures its text.
     void AdoptFontWarmUp(std::unique_ptr<FontWarmUp> warmUp);
 
     // Who answers questions and file dialogs; null restores the real boxes. Not owned.
