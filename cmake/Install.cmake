@@ -7,6 +7,7 @@
 # its own resolved path, so the link can stand anywhere on PATH.
 include_guard(GLOBAL)
 include(GNUInstallDirs)
+include(${CMAKE_CURRENT_LIST_DIR}/ResourceSettings.cmake)
 
 set(HARBOR_INSTALL_DIR ${CMAKE_INSTALL_LIBDIR}/harbor CACHE STRING
     "Folder below the prefix that holds harbor and the files beside it")
@@ -39,21 +40,7 @@ function(harbor_install_rules)
 
   # harbor.ini as the build makes it, but naming the installed folder. The prefix is only
   # known when installing (--prefix), so the file is written then.
-  file(GLOB headers RELATIVE ${res}/include CONFIGURE_DEPENDS ${res}/include/*)
-  list(SORT headers)
-  set(header_keys "")
-  set(index 1)
-  foreach(header IN LISTS headers)
-    string(APPEND header_keys "Header${index}=${header}\n")
-    math(EXPR index "${index} + 1")
-  endforeach()
-  file(GLOB firmware RELATIVE ${res}/firmware CONFIGURE_DEPENDS ${res}/firmware/*)
-  list(FILTER firmware EXCLUDE REGEX "^README|corrupt")
-  list(SORT firmware)
-  set(firmware_file "")
-  if(firmware)
-    list(GET firmware 0 firmware_file)
-  endif()
+  harbor_resource_settings(${res} header_keys firmware_file)
   install(CODE "
     set(HARBOR_OUTPUT_DIR \"\${CMAKE_INSTALL_PREFIX}/${dir}\")
     if(IS_ABSOLUTE \"${dir}\")
