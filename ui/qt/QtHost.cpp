@@ -416,6 +416,8 @@ void QtHost::SetControlText(WindowHandle dialog, int id, const char* text)
     EditEncoding encoding;
     const QString value = DecodeEditText(QByteArray(text ? text : ""), encoding);
     find(dialog)->encodings.insert(id, encoding);
+    // The same characters may now be written in another encoding, whether or not the
+    // document sees a change.
     measured_.Drop();
     if (auto* edit = qobject_cast<QPlainTextEdit*>(widget)) {
         edit->setPlainText(value);
